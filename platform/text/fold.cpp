@@ -28,6 +28,9 @@ static_assert(std::is_sorted(std::begin(kSpellings), std::end(kSpellings),
                                  return a.letter < b.letter;
                              }));
 
+constexpr char32_t kVoicing = U'\u3099';
+constexpr char32_t kHalfVoicing = U'\u309A';
+
 /* Canonical combining classes of marks that make another letter of the one before:
  * 8 kana voicing, 9 virama, 103 and 118 Thai and Lao vowels, 129-132 Tibetan vowels. */
 bool isLetterMaking(int combiningClass) {
@@ -54,10 +57,43 @@ void appendCharacter(std::string &key, char32_t character) {
     key.append(reinterpret_cast<const char *>(bytes.data()), static_cast<size_t>(length));
 }
 
+char32_t lastCharacter(std::string_view key) {
+    size_t begin = key.size() - 1;
+    while (begin > 0 && (static_cast<unsigned char>(key[begin]) & 0xC0) == 0x80) {
+        --begin;
+    }
+    std::string_view last = key.substr(begin);
+    return takeCharacter(last);
+}
+
+/* Joins the voicing of kana with its letter again, or a search for the plain letter would find
+ * the voiced one. */
+void appendVoicing(std::string &key, char32_t mark) {
+    if (!key.empty()) {
+        const char32_t letter = lastCharacter(key);
+        std::array<utf8proc_int32_t, 2> pair{static_cast<utf8proc_int32_t>(letter),
+                                             static_cast<utf8proc_int32_t>(mark)};
+        const auto options = static_cast<utf8proc_option_t>(UTF8PROC_COMPOSE | UTF8PROC_STABLE);
+        if (utf8proc_normalize_utf32(pair.data(), pair.size(), options) == 1) {
+            while ((static_cast<unsigned char>(key.back()) & 0xC0) == 0x80) {
+                key.pop_back();
+            }
+            key.pop_back();
+            appendCharacter(key, static_cast<char32_t>(pair[0]));
+            return;
+        }
+    }
+    appendCharacter(key, mark);
+}
+
 /* A character that decomposes and folds no further. */
 void appendPlain(std::string &key, char32_t character) {
     const auto *property = utf8proc_get_property(static_cast<utf8proc_int32_t>(character));
     if (isAccent(*property) || property->ignorable) {
+        return;
+    }
+    if (character == kVoicing || character == kHalfVoicing) {
+        appendVoicing(key, character);
         return;
     }
     if (property->category == UTF8PROC_CATEGORY_CC || property->category == UTF8PROC_CATEGORY_ZL ||
@@ -133,6 +169,16 @@ std::string foldedKey(std::string_view text) {
         }
     }
     return key;
+}
+
+std::string lowerCase(std::string_view text) {
+    std::string lower;
+    lower.reserve(text.size());
+    while (!text.empty()) {
+        const auto character = static_cast<utf8proc_int32_t>(takeCharacter(text));
+        appendCharacter(lower, static_cast<char32_t>(utf8proc_tolower(character)));
+    }
+    return lower;
 }
 
 std::string_view cutAtCharacter(std::string_view text, size_t maxBytes) {

@@ -2,7 +2,8 @@
  *
  * Two texts that differ only in case, accents, composed or decomposed letters, width, hyphens
  * or typographic quotes have one key. A key is built character by character, so the key of a
- * part of a text is a part of the key of the text, and a key is its own key.
+ * part of a text is a part of the key of the text (where the part does not cut a kana from its
+ * voicing), and a key is its own key.
  *
  * What is done to each character: compatibility decomposition (Unicode NFKD) and full case
  * folding; accents dropped (marks with a combining class, but not the voicing of kana, viramas
@@ -19,6 +20,9 @@ namespace zano {
 
 /* The key of a text in UTF-8; a byte that is not part of a valid sequence counts as U+FFFD. */
 std::string foldedKey(std::string_view text);
+
+/* The text with its capitals as small letters, character by character. */
+std::string lowerCase(std::string_view text);
 
 /* Takes one character, or one invalid byte, from the front of text, which is not empty. */
 char32_t takeCharacter(std::string_view &text);

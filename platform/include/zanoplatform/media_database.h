@@ -13,7 +13,7 @@
  *   select      "*", or columns with "as": " artist as title "
  *   condition   = <> != < <= > >= , [not] like, [not] ilike, [not] in (..), [not] between,
  *               is [not] null, and, or, not, ( ), numbers, 'texts' with '' for a quote,
- *               lower(), upper(), length(), abs(), coalesce()
+ *               lower(), length()
  *   order       columns or lower(column), asc or desc, separated by commas; or RANDOM()
  *
  * `like` is exact; `ilike` ignores case and accents in every script. In both, % stands for any

@@ -1,0 +1,232 @@
+#include <zanoplatform/media_database.h>
+
+#include <sys/stat.h>
+#include <zanoplatform/error.h>
+#include <zanoplatform/settings.h>
+
+#include <array>
+#include <cstdlib>
+#include <mutex>
+#include <optional>
+#include <tuple>
+
+#include "engine.h"
+#include "query/parse.h"
+#include "sqlite/engine.h"
+#include "strings/error_internal.h"
+#include "system_paths_internal.h"
+
+namespace zano::mediadb {
+namespace {
+
+struct EngineKind {
+    std::string_view scheme;
+    std::unique_ptr<Engine> (*make)(const std::string &place);
+    std::unique_ptr<Catalogue> (*openCatalogue)(const std::string &place);
+};
+
+constexpr std::array kEngines = {
+    EngineKind{"sqlite:", sqlite::makeEngine, sqlite::openCatalogue},
+};
+
+/* The engine that a location names, and the location without the engine's name. */
+std::pair<const EngineKind *, std::string> engineOf(const std::string &location) {
+    for (const EngineKind &kind : kEngines) {
+        if (location.compare(0, kind.scheme.size(), kind.scheme) == 0) {
+            return {&kind, location.substr(kind.scheme.size())};
+        }
+    }
+    throw DatabaseError(KLIB_ERR_BAD_CONFIGURATION,
+                        "the setting mediadb is not \"sqlite:\" and a path: " + location);
+}
+
+/* The engine of the current settings. They are looked at again when their file changes, so that
+ * a long-running program follows. A cursor keeps the engine it was opened on. */
+class CurrentEngine {
+  public:
+    std::shared_ptr<Engine> get() {
+        struct stat file {};
+        const bool isThere = stat(ZANO_PATH_CONF, &file) == 0;
+        const Stamp stamp{isThere, file.st_ino, file.st_size, file.st_mtim.tv_sec,
+                          file.st_mtim.tv_nsec};
+        const std::lock_guard lock(mutex_);
+        if (!engine_ || stamp != stamp_) {
+            const std::string location = configuredLocation();
+            if (!engine_ || location != location_) {
+                const auto [kind, place] = engineOf(location);
+                engine_ = kind->make(place);
+                location_ = location;
+            }
+            stamp_ = stamp;
+        }
+        return engine_;
+    }
+
+  private:
+    using Stamp = std::tuple<bool, ino_t, off_t, time_t, long>;
+    std::mutex mutex_;
+    std::shared_ptr<Engine> engine_;
+    std::string location_;
+    Stamp stamp_;
+};
+
+std::shared_ptr<Engine> currentEngine() {
+    static CurrentEngine current;
+    return current.get();
+}
+
+Table tableOf(int kind) {
+    switch (kind) {
+        case MEDIA_TABLE_SONGS:
+        case MEDIA_TABLE_SONG_PATHS:
+            return Table::Songs;
+        case MEDIA_TABLE_PLAYLISTS:
+            return Table::Playlists;
+        default:
+            throw QueryError("there is no table of kind " + std::to_string(kind));
+    }
+}
+
+struct Held {
+    std::shared_ptr<Engine> engine;
+    std::unique_ptr<Cursor> cursor;  // ends before its engine
+};
+
+/* The border: runs `action` and turns what it throws into the error of this thread. */
+template <typename Action>
+int guarded(Action action) noexcept {
+    try {
+        clearError();
+        return action();
+    } catch (const DatabaseError &error) {
+        setError(error.code(), error.what());
+    } catch (const QueryError &error) {
+        setError(KLIB_ERR_DATABASE_QUERY, error.what());
+    } catch (const std::bad_alloc &) {
+        setError(KLIB_ERR_OUT_OF_MEMORY, "out of memory in the media database");
+    } catch (const std::exception &error) {
+        setError(KLIB_ERR_DATABASE_FAILED, error.what());
+    }
+    return -1;
+}
+
+int clampedToInt(std::int64_t count) {
+    return static_cast<int>(std::min<std::int64_t>(count, INT32_MAX));
+}
+
+void requirePlaylists(int table, const void *argument) {
+    if (table != MEDIA_TABLE_PLAYLISTS || argument == nullptr) {
+        throw DatabaseError(KLIB_ERR_BAD_PARAMETER, "only rows of playlists can be written");
+    }
+}
+
+}  // namespace
+
+std::string configuredLocation() {
+    return ZanoConf().Info("mediadb", "sqlite:" ZANO_PATH_MEDIA_DB);
+}
+
+std::unique_ptr<Catalogue> openCatalogue() {
+    return openCatalogue(configuredLocation());
+}
+
+std::unique_ptr<Catalogue> openCatalogue(const std::string &location) {
+    const auto [kind, place] = engineOf(location);
+    return kind->openCatalogue(place);
+}
+
+}  // namespace zano::mediadb
+
+using namespace zano::mediadb;
+
+MEDIA_DB_RESULT *MediaInfoDBOpen(int table, const char *select, const char *condition,
+                                 const char *distinct, const char *orderBy, int offset, int limit,
+                                 int) {
+    std::unique_ptr<MEDIA_DB_RESULT> result;
+    const int status = guarded([&] {
+        Query query;
+        query.table = tableOf(table);
+        query.select = parseSelect(query.table, select);
+        query.condition = parseCondition(query.table, condition);
+        query.distinct = parseDistinct(query.table, distinct);
+        parseOrder(orderBy, query);
+        query.offset = std::max(offset, 0);
+        query.limit = std::max(limit, 0);
+        auto held = std::make_unique<Held>();
+        held->engine = currentEngine();
+        held->cursor = held->engine->open(std::move(query));
+        const bool isWhole = offset <= 0 && limit <= 0;
+        const int rows = isWhole ? clampedToInt(held->cursor->countAll()) : 0;
+        result.reset(new MEDIA_DB_RESULT{table, offset, limit, rows, nullptr});
+        result->cursor = held.release();
+        return 0;
+    });
+    return status == 0 ? result.release() : nullptr;
+}
+
+int MediaInfoDBGet(MEDIA_DB_RESULT *result, ZANO_MEDIA_INFO *row) {
+    return guarded([&] {
+        if (result == nullptr || row == nullptr) {
+            throw DatabaseError(KLIB_ERR_BAD_PARAMETER, "no result or no record given");
+        }
+        return static_cast<Held *>(result->cursor)->cursor->next(*row) ? 0 : -1;
+    });
+}
+
+void MediaInfoDBClose(MEDIA_DB_RESULT *result) {
+    if (result != nullptr) {
+        delete static_cast<Held *>(result->cursor);
+        delete result;
+    }
+}
+
+int MediaInfoDBGetCount(int table, const char *countExpression, const char *condition, int, int) {
+    return guarded([&] {
+        CountQuery query;
+        query.table = tableOf(table);
+        query.distinct = parseCountExpression(query.table, countExpression);
+        query.condition = parseCondition(query.table, condition);
+        return clampedToInt(currentEngine()->count(query));
+    });
+}
+
+int MediaInfoDBSave(int table, const ZANO_MEDIA_INFO *row) {
+    return guarded([&] {
+        requirePlaylists(table, row);
+        currentEngine()->savePlaylist(*row);
+        return 0;
+    });
+}
+
+int MediaInfoDBUpdate(int table, const ZANO_MEDIA_INFO *row) {
+    return guarded([&] {
+        requirePlaylists(table, row);
+        return currentEngine()->updatePlaylist(*row) ? 0 : -1;
+    });
+}
+
+int MediaInfoDBDelete(int table, const char *path) {
+    return guarded([&] {
+        requirePlaylists(table, path);
+        currentEngine()->deletePlaylist(path);
+        return 0;
+    });
+}
+
+void ZANOPlaylistRecFree(ZANO_PLAYLIST_REC *list) {
+    while (list != nullptr) {
+        ZANO_PLAYLIST_REC *next = list->next;
+        std::free(list);
+        list = next;
+    }
+}
+
+int KLIBZanoFileIndexAdd(const char *path, const char *formerPath, int operation) {
+    return guarded([&] {
+        if (path == nullptr) {
+            throw DatabaseError(KLIB_ERR_BAD_PARAMETER, "no path given");
+        }
+        currentEngine()->addNotice({0, path, formerPath != nullptr ? formerPath : "", operation});
+        return 0;
+    });
+}

@@ -1,0 +1,177 @@
+#include "render.h"
+
+#include <algorithm>
+#include <utility>
+
+#include "text/fold.h"
+#include "tokens.h"
+
+namespace zano::mediadb {
+
+std::string_view orderColumn(Column column) {
+    const ColumnInfo &info = columnInfo(column);
+    return info.key.empty() ? info.name : info.key;
+}
+
+Sql &Sql::bind(Value value) {
+    values_.push_back(std::move(value));
+    text_.push_back(dialect_->parameterSign);
+    text_.append(std::to_string(values_.size()));
+    return *this;
+}
+
+void Sql::addOrder(const std::vector<OrderTerm> &order, std::string_view qualifier) {
+    std::string_view separator;
+    for (const OrderTerm &term : order) {
+        add(separator).add(qualifier).add(orderColumn(term.column));
+        add(term.descending ? " DESC" : "");
+        separator = ", ";
+    }
+}
+
+void Sql::addPathRange(std::string_view prefix, std::string_view qualifier) {
+    add("(").add(qualifier).add("path >= ").bind(std::string(prefix));
+    if (auto end = endOfPrefix(prefix)) {
+        add(" AND ").add(qualifier).add("path < ").bind(std::move(*end));
+    }
+    add(")");
+}
+
+void Sql::addCondition(const Expression &expression, std::string_view qualifier) {
+    using Kind = Expression::Kind;
+    const std::string_view no = expression.negated ? "NOT " : "";
+    switch (expression.kind) {
+        case Kind::Column:
+            add(qualifier).add(columnInfo(expression.column).name);
+            break;
+        case Kind::Literal:
+            bind(expression.value);
+            break;
+        case Kind::Call:
+            add(expression.function == "lower" ? dialect_->lower : dialect_->length).add("(");
+            addCondition(expression.parts[0], qualifier);
+            add(")");
+            break;
+        case Kind::Not:
+            add("(NOT ");
+            addCondition(expression.parts[0], qualifier);
+            add(")");
+            break;
+        case Kind::And:
+            addJoined(expression, " AND ", qualifier);
+            break;
+        case Kind::Or:
+            addJoined(expression, " OR ", qualifier);
+            break;
+        case Kind::Compare:
+            addCompare(expression, qualifier);
+            break;
+        case Kind::Like:
+            add("(").add(no);
+            addLike(expression, qualifier);
+            add(")");
+            break;
+        case Kind::In:
+            add("(").add(no);
+            addIn(expression, qualifier);
+            add(")");
+            break;
+        case Kind::Between:
+            add("(");
+            addCondition(expression.parts[0], qualifier);
+            add(" ").add(no).add("BETWEEN ");
+            addCondition(expression.parts[1], qualifier);
+            add(" AND ");
+            addCondition(expression.parts[2], qualifier);
+            add(")");
+            break;
+        case Kind::IsNull:
+            add("(");
+            addCondition(expression.parts[0], qualifier);
+            add(expression.negated ? " IS NOT NULL)" : " IS NULL)");
+            break;
+    }
+}
+
+void Sql::addJoined(const Expression &expression, std::string_view word,
+                    std::string_view qualifier) {
+    std::string_view separator = "(";
+    for (const Expression &part : expression.parts) {
+        add(separator);
+        addCondition(part, qualifier);
+        separator = word;
+    }
+    add(")");
+}
+
+void Sql::addCompare(const Expression &expression, std::string_view qualifier) {
+    const Expression &left = expression.parts[0];
+    const Expression &right = expression.parts[1];
+    add("(");
+    addCondition(left, qualifier);
+    add(expression.operation);
+    addCondition(right, qualifier);
+    /* Equal texts have equal keys, and only the keys are indexed. */
+    const bool isKeyed = expression.operation == "=" && left.kind == Expression::Kind::Column &&
+                         !columnInfo(left.column).key.empty() &&
+                         right.kind == Expression::Kind::Literal &&
+                         std::holds_alternative<std::string>(right.value);
+    if (isKeyed) {
+        add(" AND ").add(qualifier).add(columnInfo(left.column).key).add("=");
+        bind(foldedKey(std::get<std::string>(right.value)));
+    }
+    add(")");
+}
+
+void Sql::addIn(const Expression &expression, std::string_view qualifier) {
+    addCondition(expression.parts[0], qualifier);
+    std::string_view separator = " IN (";
+    for (auto part = expression.parts.begin() + 1; part != expression.parts.end(); ++part) {
+        add(separator);
+        addCondition(*part, qualifier);
+        separator = ",";
+    }
+    add(")");
+}
+
+void Sql::addLike(const Expression &expression, std::string_view qualifier) {
+    const Expression &subject = expression.parts[0];
+    const Pattern pattern(std::get<std::string>(expression.parts[1].value), expression.ignoreCase);
+    if (pattern.matchesEverything()) {
+        add("1=1");
+        return;
+    }
+    const bool isColumn = subject.kind == Expression::Kind::Column;
+    const auto addSubject = [&] {
+        if (expression.ignoreCase && isColumn && !columnInfo(subject.column).key.empty()) {
+            add(qualifier).add(columnInfo(subject.column).key);
+        } else if (expression.ignoreCase) {
+            add(dialect_->fold).add("(");
+            addCondition(subject, qualifier);
+            add(")");
+        } else {
+            addCondition(subject, qualifier);
+        }
+    };
+    if (const auto text = pattern.exact()) {
+        addSubject();
+        add("=").bind(std::string(*text));
+    } else if (const auto part = pattern.part()) {
+        add(dialect_->position).add("(");
+        addSubject();
+        add(",").bind(std::string(*part)).add(")>0");
+    } else if (isColumn && subject.column == Column::Path && pattern.prefix() &&
+               !expression.ignoreCase) {
+        addPathRange(*pattern.prefix(), qualifier);
+    } else {
+        std::string like = pattern.likeText();
+        if (like.size() > dialect_->maxPatternBytes) {
+            throw QueryError("the query has a pattern of more than " +
+                             std::to_string(dialect_->maxPatternBytes) + " bytes");
+        }
+        addSubject();
+        add(" LIKE ").bind(std::move(like)).add(" ESCAPE '\\'");
+    }
+}
+
+}  // namespace zano::mediadb

@@ -1,0 +1,61 @@
+/* Writes conditions and orders in the SQL of an engine. Every value is bound, none is written
+ * into the text; the few words that differ between engines are in Dialect. */
+#pragma once
+
+#include <string>
+#include <vector>
+
+#include "analysis.h"
+
+namespace zano::mediadb {
+
+struct Dialect {
+    /* "?1", "$1": the sign before the number of a parameter. */
+    char parameterSign;
+    /* Functions of the engine: position of a text in a text (0: not there), the folded key of a
+     * text, its small letters, its number of characters. */
+    std::string_view position;
+    std::string_view fold;
+    std::string_view lower;
+    std::string_view length;
+    /* The longest LIKE pattern the engine takes, in bytes. */
+    size_t maxPatternBytes;
+};
+
+/* A statement being put together: its text and its values. */
+class Sql {
+  public:
+    explicit Sql(const Dialect &dialect) : dialect_(&dialect) {}
+
+    Sql &add(std::string_view text) {
+        text_.append(text);
+        return *this;
+    }
+    /* A parameter with its value. */
+    Sql &bind(Value value);
+
+    /* A condition; `qualifier` ("songs.", say) stands before every column. */
+    void addCondition(const Expression &expression, std::string_view qualifier);
+    /* path >= prefix and path < its end. */
+    void addPathRange(std::string_view prefix, std::string_view qualifier);
+    /* Columns with their folded keys where they have one. */
+    void addOrder(const std::vector<OrderTerm> &order, std::string_view qualifier);
+
+    const std::string &text() const { return text_; }
+    const std::vector<Value> &values() const { return values_; }
+
+  private:
+    void addJoined(const Expression &expression, std::string_view word, std::string_view qualifier);
+    void addLike(const Expression &expression, std::string_view qualifier);
+    void addCompare(const Expression &expression, std::string_view qualifier);
+    void addIn(const Expression &expression, std::string_view qualifier);
+
+    const Dialect *dialect_;
+    std::string text_;
+    std::vector<Value> values_;
+};
+
+/* The column that orders: the folded key where there is one. */
+std::string_view orderColumn(Column column);
+
+}  // namespace zano::mediadb

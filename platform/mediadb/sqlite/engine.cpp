@@ -1,0 +1,391 @@
+#include "engine.h"
+
+#include <algorithm>
+#include <array>
+#include <cstring>
+#include <random>
+#include <unordered_set>
+#include <utility>
+
+#include "plan.h"
+#include "reader.h"
+#include "text/fold.h"
+
+namespace zano::mediadb::sqlite {
+namespace {
+
+template <size_t width>
+void putText(char (&field)[width], std::string_view text) {
+    const std::string_view cut = cutAtCharacter(text, width - 1);
+    std::memcpy(field, cut.data(), cut.size());
+}
+
+/* Writes one column of a row into a field of a record that is zero. */
+void putColumn(const Statement &row, int index, Column field, ZANO_MEDIA_INFO &record) {
+    switch (field) {
+        case Column::Id:
+            record.id = static_cast<int>(row.integer(index));
+            break;
+        case Column::Path:
+            putText(record.path, row.text(index));
+            break;
+        case Column::Title:
+            putText(record.title, row.text(index));
+            break;
+        case Column::Album:
+            putText(record.album, row.text(index));
+            break;
+        case Column::Artist:
+            putText(record.artist, row.text(index));
+            break;
+        case Column::Genre:
+            putText(record.genre, row.text(index));
+            break;
+        case Column::Track:
+            record.track = static_cast<int>(row.integer(index));
+            break;
+        case Column::Disc:
+            record.disc = static_cast<int>(row.integer(index));
+            break;
+        case Column::Year:
+            record.year = static_cast<int>(row.integer(index));
+            break;
+        case Column::Duration:
+            record.duration = static_cast<float>(row.real(index));
+            break;
+        case Column::Bitrate:
+            record.bitrate = static_cast<int>(row.integer(index));
+            break;
+        case Column::Frequency:
+            record.frequency = static_cast<int>(row.integer(index));
+            break;
+        case Column::AlbumArtist:
+            break;  // the record has no place for it
+    }
+}
+
+void putRow(const Statement &row, const std::vector<SelectedColumn> &select,
+            ZANO_MEDIA_INFO &record) {
+    std::memset(&record, 0, sizeof record);
+    int index = 0;
+    for (const SelectedColumn &selected : select) {
+        putColumn(row, index++, selected.field, record);
+    }
+}
+
+std::string columnList(const std::vector<SelectedColumn> &select, std::string_view qualifier) {
+    std::string list;
+    for (const SelectedColumn &selected : select) {
+        list.append(list.empty() ? "" : ", ").append(qualifier);
+        list.append(columnInfo(selected.column).name);
+    }
+    return list;
+}
+
+/* What all cursors share: the reader with its snapshot, and the query. */
+class BaseCursor : public Cursor {
+  public:
+    BaseCursor(ReaderPool::Lease reader, Query query)
+        : reader_(std::move(reader)), query_(std::move(query)) {}
+
+  protected:
+    Reader &reader() { return *reader_; }
+    const Query &query() const { return query_; }
+
+  private:
+    ReaderPool::Lease reader_;
+    Query query_;
+};
+
+/* The rows of one statement. It does not run before the first row is asked for, since some
+ * callers want the count alone. */
+class StatementCursor : public BaseCursor {
+  public:
+    StatementCursor(ReaderPool::Lease lease, Query asked)
+        : BaseCursor(std::move(lease), std::move(asked)), sql_(dialect()) {}
+
+    bool next(ZANO_MEDIA_INFO &row) override {
+        reader().restartClock();
+        if (isDone_) {
+            return false;
+        }
+        if (statement_ == nullptr) {
+            statement_ = &reader().statement(sql_);
+        }
+        isDone_ = !statement_->step();
+        if (!isDone_) {
+            putRow(*statement_, query().select, row);
+        }
+        return !isDone_;
+    }
+
+  protected:
+    /* Prepares too, so that a text that the engine refuses fails when the query is opened. */
+    void setSql(Sql sql) {
+        sql_ = std::move(sql);
+        reader().statement(sql_.text());
+    }
+
+  private:
+    Sql sql_;
+    Statement *statement_ = nullptr;
+    bool isDone_ = false;
+};
+
+class SongCursor : public StatementCursor {
+  public:
+    SongCursor(ReaderPool::Lease lease, Query asked)
+        : StatementCursor(std::move(lease), std::move(asked)), plan_(reader(), query().condition) {
+        if (const Facet *facet = facetOfQuery()) {
+            setSql(facetPage(*facet));
+        } else {
+            const std::string columns = columnList(query().select, "songs.");
+            setSql(query().distinct ? plan_.distinctPage(columns, query())
+                                    : plan_.page(columns, query()));
+        }
+    }
+
+    std::int64_t countAll() override { return plan_.count(query().distinct); }
+
+  private:
+    /* The kept values serve a query for nothing but one column's values, sorted by them. */
+    const Facet *facetOfQuery() {
+        const bool asksForValues =
+            query().distinct && plan_.isUnconditional() && reader().state().isOrdered &&
+            query().select.size() == 1 && query().select[0].column == *query().distinct &&
+            (query().order.empty() || query().order[0].column == *query().distinct);
+        if (!asksForValues) {
+            return nullptr;
+        }
+        const auto &rows = facets();
+        const auto row = std::find_if(rows.begin(), rows.end(), [this](const Facet &facet) {
+            return facet.column == *query().distinct;
+        });
+        return row == rows.end() ? nullptr : &*row;
+    }
+
+    Sql facetPage(const Facet &facet) {
+        const bool isDescending = !query().order.empty() && query().order[0].descending;
+        Sql sql(dialect());
+        sql.add("SELECT name FROM facets WHERE facet=").bind(std::int64_t{facet.number});
+        sql.add(isDescending ? " ORDER BY key DESC, name DESC" : " ORDER BY key, name");
+        sql.add(" LIMIT ").bind(query().limit > 0 ? query().limit : std::int64_t{-1});
+        sql.add(" OFFSET ").bind(query().offset);
+        return sql;
+    }
+
+    SongPlan plan_;
+};
+
+class PlaylistCursor : public StatementCursor {
+  public:
+    PlaylistCursor(ReaderPool::Lease lease, Query asked)
+        : StatementCursor(std::move(lease), std::move(asked)) {
+        Sql sql(dialect());
+        sql.add("SELECT ").add(columnList(query().select, "")).add(" FROM playlists");
+        if (query().distinct) {
+            sql.add(" WHERE id IN (SELECT min(id) FROM playlists");
+            addWhere(sql);
+            sql.add(" GROUP BY ").add(columnInfo(*query().distinct).name).add(")");
+        } else {
+            addWhere(sql);
+        }
+        sql.add(" ORDER BY ");
+        if (query().random) {
+            sql.add("random()");
+        } else {
+            addFullOrder(sql, query().order, "");
+        }
+        sql.add(" LIMIT ").bind(query().limit > 0 ? query().limit : std::int64_t{-1});
+        sql.add(" OFFSET ").bind(query().offset);
+        setSql(std::move(sql));
+    }
+
+    std::int64_t countAll() override {
+        Sql sql(dialect());
+        sql.add("SELECT count(");
+        if (query().distinct) {
+            sql.add("DISTINCT ").add(columnInfo(*query().distinct).name);
+        } else {
+            sql.add("*");
+        }
+        sql.add(") FROM playlists");
+        addWhere(sql);
+        return reader().integer(sql);
+    }
+
+  private:
+    void addWhere(Sql &sql) const {
+        if (query().condition) {
+            sql.add(" WHERE ");
+            sql.addCondition(*query().condition, "");
+        }
+    }
+};
+
+/* Songs in random order. A few of many are drawn by their ids, without a look at the others. */
+class RandomCursor : public BaseCursor {
+  public:
+    RandomCursor(ReaderPool::Lease lease, Query asked)
+        : BaseCursor(std::move(lease), std::move(asked)),
+          plan_(reader(), query().condition),
+          byId_("SELECT " + columnList(query().select, "songs.") + " FROM songs WHERE songs.id=?1"),
+          random_(std::random_device{}()) {
+        if (!query().distinct && plan_.isUnconditional() && query().limit > 0) {
+            findRange();
+        }
+        if (!isDrawing_) {
+            shuffle();
+        }
+    }
+
+    bool next(ZANO_MEDIA_INFO &row) override {
+        reader().restartClock();
+        while (left_ > 0) {
+            const std::int64_t id = isDrawing_ ? draw() : ids_[static_cast<size_t>(left_ - 1)];
+            Using song(reader().statement(byId_));
+            song->bind(1, id);
+            if (song->step()) {
+                putRow(reader().statement(byId_), query().select, row);
+                --left_;
+                return true;
+            }
+        }
+        return false;
+    }
+
+    std::int64_t countAll() override { return plan_.count(query().distinct); }
+
+  private:
+    /* Drawing again when an id is free or was drawn takes few tries while a quarter of the ids
+     * in use are free at most and few songs are wanted. */
+    void findRange() {
+        const std::int64_t songs = reader().state().songs;
+        Sql least(dialect());
+        least.add("SELECT min(id) FROM songs");
+        Sql greatest(dialect());
+        greatest.add("SELECT max(id) FROM songs");
+        first_ = reader().integer(least);
+        last_ = reader().integer(greatest);
+        left_ = std::clamp<std::int64_t>(songs - query().offset, 0, query().limit);
+        isDrawing_ = left_ <= songs / 4 && last_ - first_ < 4 * songs;
+    }
+
+    std::int64_t draw() {
+        for (;;) {
+            const std::int64_t id = std::uniform_int_distribution(first_, last_)(random_);
+            if (drawn_.insert(id).second) {
+                return id;
+            }
+        }
+    }
+
+    void shuffle() {
+        const Sql sql = plan_.ids();
+        {
+            Using rows(reader().statement(sql));
+            while (rows->step()) {
+                ids_.push_back(rows->integer(0));
+            }
+        }
+        std::shuffle(ids_.begin(), ids_.end(), random_);
+        const auto all = static_cast<std::int64_t>(ids_.size());
+        left_ = std::max<std::int64_t>(all - query().offset, 0);
+        if (query().limit > 0) {
+            left_ = std::min(left_, query().limit);
+        }
+    }
+
+    SongPlan plan_;
+    std::string byId_;
+    std::mt19937_64 random_;
+    bool isDrawing_ = false;
+    std::int64_t first_ = 0;
+    std::int64_t last_ = 0;
+    std::int64_t left_ = 0;
+    std::unordered_set<std::int64_t> drawn_;
+    std::vector<std::int64_t> ids_;
+};
+
+class SqliteEngine : public Engine {
+  public:
+    explicit SqliteEngine(const std::string &path)
+        : path_(path), pool_(std::make_shared<ReaderPool>(path)) {}
+
+    std::unique_ptr<Cursor> open(Query query) override {
+        auto lease = pool_->lease();
+        if (query.table == Table::Playlists) {
+            return std::make_unique<PlaylistCursor>(std::move(lease), std::move(query));
+        }
+        if (query.random) {
+            return std::make_unique<RandomCursor>(std::move(lease), std::move(query));
+        }
+        return std::make_unique<SongCursor>(std::move(lease), std::move(query));
+    }
+
+    std::int64_t count(const CountQuery &query) override {
+        auto lease = pool_->lease();
+        if (query.table == Table::Songs) {
+            return SongPlan(*lease, query.condition).count(query.distinct);
+        }
+        Query rows;
+        rows.table = query.table;
+        rows.select = {{Column::Id, Column::Id}};
+        rows.distinct = query.distinct;
+        rows.condition = query.condition;
+        return PlaylistCursor(std::move(lease), std::move(rows)).countAll();
+    }
+
+    void savePlaylist(const ZANO_MEDIA_INFO &row) override {
+        Connection connection = openForWriting(path_);
+        Statement insert = connection.prepare(
+            "INSERT INTO playlists(path, title, album, title_key, album_key) "
+            "VALUES(?1, ?2, ?3, ?4, ?5) ON CONFLICT(path) DO UPDATE SET title=?2, album=?3, "
+            "title_key=?4, album_key=?5");
+        bindPlaylist(insert, row);
+    }
+
+    bool updatePlaylist(const ZANO_MEDIA_INFO &row) override {
+        Connection connection = openForWriting(path_);
+        Statement update = connection.prepare(
+            "UPDATE playlists SET path=?1, title=?2, album=?3, title_key=?4, album_key=?5 "
+            "WHERE id=?6");
+        update.bind(6, row.id);
+        bindPlaylist(update, row);
+        return connection.changes() > 0;
+    }
+
+    bool deletePlaylist(const std::string &path) override {
+        Connection connection = openForWriting(path_);
+        connection.prepare("DELETE FROM playlists WHERE path=?1").bind(1, path).run();
+        return connection.changes() > 0;
+    }
+
+    void addNotice(const Notice &notice) override {
+        Connection connection = openForWriting(path_);
+        connection.prepare("INSERT INTO notices(path, former_path, operation) VALUES(?1, ?2, ?3)")
+            .bind(1, notice.path)
+            .bind(2, notice.formerPath)
+            .bind(3, notice.operation)
+            .run();
+    }
+
+  private:
+    static void bindPlaylist(Statement &statement, const ZANO_MEDIA_INFO &row) {
+        const std::string titleKey = foldedKey(row.title);
+        const std::string albumKey = foldedKey(row.album);
+        statement.bind(1, std::string_view(row.path)).bind(2, std::string_view(row.title));
+        statement.bind(3, std::string_view(row.album)).bind(4, titleKey).bind(5, albumKey).run();
+    }
+
+    std::string path_;
+    std::shared_ptr<ReaderPool> pool_;
+};
+
+}  // namespace
+
+std::unique_ptr<Engine> makeEngine(const std::string &path) {
+    return std::make_unique<SqliteEngine>(path);
+}
+
+}  // namespace zano::mediadb::sqlite

@@ -1,0 +1,329 @@
+#include "plan.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <utility>
+
+namespace zano::mediadb::sqlite {
+namespace {
+
+/* Steps of one entry, measured against each other: an entry of an index, a row fetched through
+ * it, an entry of a token's list. Only their ratios matter, and only for speed. */
+constexpr double kFetchCost = 8;
+constexpr double kPrefixEntryCost = 1.5;
+/* Songs outside of the music root that are counted before counting those inside instead. */
+constexpr std::int64_t kOutsideBound = 20000;
+
+Sql newSql(std::string_view text) {
+    Sql sql(dialect());
+    sql.add(text);
+    return sql;
+}
+
+}  // namespace
+
+const Dialect &dialect() {
+    static constexpr Dialect kDialect{'?', "instr", "zano_fold", "zano_lower", "length", 50000};
+    return kDialect;
+}
+
+void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier) {
+    if (!order.empty()) {
+        sql.addOrder(order, qualifier);
+        sql.add(", ");
+    }
+    sql.add(qualifier).add("id");
+}
+
+SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
+    : reader_(reader), conjuncts_(conjunctsOf(condition)) {
+    conjuncts_.erase(std::remove_if(conjuncts_.begin(), conjuncts_.end(),
+                                    [this](const Conjunct &conjunct) {
+                                        return !conjunct.pathPrefix.empty() &&
+                                               coversAllPaths(conjunct.pathPrefix);
+                                    }),
+                     conjuncts_.end());
+    answered_.resize(conjuncts_.size());
+    if (reader_.state().isOrdered) {
+        findGrams();
+    }
+}
+
+/* Nearly always true of the music root. Two looks into the index of paths are cheaper than a
+ * comparison for each row, and let counts be answered without looking at rows at all. */
+bool SongPlan::coversAllPaths(const std::string &prefix) {
+    for (const std::string_view end : {"min", "max"}) {
+        Using row(reader_.statement("SELECT " + std::string(end) + "(path) FROM songs"));
+        if (!row->step() || row->isNull(0) || row->text(0).substr(0, prefix.size()) != prefix) {
+            return false;
+        }
+    }
+    return true;
+}
+
+void SongPlan::findGrams() {
+    GramQuery all{{}, true, false};
+    for (size_t i = 0; i < conjuncts_.size(); ++i) {
+        const auto group =
+            conjuncts_[i].searches.empty() ? std::nullopt : gramQueryOf(conjuncts_[i].searches);
+        if (!group) {
+            continue;
+        }
+        all.match += (all.match.empty() ? "(" : " AND (") + group->match + ")";
+        all.isShort = all.isShort || group->isShort;
+        answered_[i] = group->isExact;
+        terms_.insert(terms_.end(), conjuncts_[i].searches.begin(), conjuncts_[i].searches.end());
+    }
+    if (!all.match.empty()) {
+        all.isExact = std::all_of(answered_.begin(), answered_.end(), [](bool is) { return is; });
+        grams_ = std::move(all);
+    }
+}
+
+void SongPlan::addMatch(Sql &sql) {
+    sql.add("grams MATCH ").bind(grams_->match);
+}
+
+void SongPlan::addWhere(Sql &sql, bool withGrams) {
+    std::string_view word = " WHERE ";
+    if (withGrams) {
+        addMatch(sql.add(word));
+        word = " AND ";
+    }
+    for (size_t i = 0; i < conjuncts_.size(); ++i) {
+        if (withGrams && answered_[i]) {
+            continue;
+        }
+        sql.add(word);
+        sql.addCondition(*conjuncts_[i].expression, "songs.");
+        word = " AND ";
+    }
+}
+
+void SongPlan::addSource(Sql &sql, bool withGrams) {
+    sql.add(withGrams ? " FROM grams CROSS JOIN songs ON songs.rank=grams.rowid" : " FROM songs");
+    addWhere(sql, withGrams);
+}
+
+void SongPlan::addPage(Sql &sql, Page page) {
+    if (page.limit > 0 || page.offset > 0) {
+        sql.add(" LIMIT ").bind(page.limit > 0 ? page.limit : std::int64_t{-1});
+        sql.add(" OFFSET ").bind(page.offset);
+    }
+}
+
+Sql SongPlan::stream(std::string_view columns, Page page) {
+    Sql sql = newSql("SELECT ").add(columns);
+    addSource(sql, true);
+    sql.add(" ORDER BY grams.rowid");
+    addPage(sql, page);
+    return sql;
+}
+
+Sql SongPlan::candidates(std::string_view columns, const StoredOrder &order, Page page) {
+    Sql sql = newSql("SELECT ").add(columns);
+    addSource(sql, true);
+    /* The signs keep SQLite from walking an index of the order instead. */
+    sql.add(" ORDER BY ").add(orderText(order, "+songs."));
+    addPage(sql, page);
+    return sql;
+}
+
+Sql SongPlan::walk(std::string_view columns, const StoredOrder &order, Page page) {
+    Sql sql = newSql("SELECT ").add(columns).add(" FROM songs");
+    if (!order.index.empty()) {
+        sql.add(" INDEXED BY ").add(order.index);
+    }
+    addWhere(sql, false);
+    sql.add(" ORDER BY ").add(orderText(order, "songs."));
+    addPage(sql, page);
+    return sql;
+}
+
+/* Deep pages of the whole library begin at the nearest anchor, if the anchors were set in the
+ * very state of the catalogue that is being read. */
+std::optional<Sql> SongPlan::anchored(std::string_view columns, const StoredOrder &order,
+                                      Page page) {
+    if (page.offset < kAnchorDistance || reader_.state().anchored != reader_.state().generation) {
+        return std::nullopt;
+    }
+    Sql find =
+        newSql("SELECT song FROM anchors WHERE stored_order=").bind(std::int64_t{order.number});
+    find.add(" AND place=").bind(page.offset / kAnchorDistance);
+    const std::int64_t song = reader_.integer(find, -1);
+    if (song < 0) {
+        return std::nullopt;
+    }
+    Sql sql = newSql("SELECT ").add(columns).add(" FROM songs");
+    if (!order.index.empty()) {
+        sql.add(" INDEXED BY ").add(order.index);
+    }
+    std::string place;
+    if (!order.key.empty()) {
+        place.append(order.key).append(", ");
+    }
+    place.append(order.tail);
+    sql.add(" WHERE (").add(place).add(order.descending ? ")<=(SELECT " : ")>=(SELECT ");
+    sql.add(place).add(" FROM songs WHERE id=").bind(song).add(") ORDER BY ");
+    sql.add(orderText(order, "songs."));
+    addPage(sql, {page.offset % kAnchorDistance, page.limit});
+    return sql;
+}
+
+Sql SongPlan::page(std::string_view columns, const Query &query) {
+    const Page page{query.offset, query.limit};
+    const std::vector<OrderTerm> byId = {{Column::Id}};
+    const auto &order = query.order.empty() ? byId : query.order;
+    const auto leading = order.front().column == Column::Id || order.front().column == Column::Path
+                             ? std::optional(order.front())
+                             : leadingTermOf(order);
+    const StoredOrder *stored =
+        leading && reader_.state().isOrdered ? findStoredOrder(*leading) : nullptr;
+    if (stored != nullptr && conjuncts_.empty()) {
+        auto deep = anchored(columns, *stored, page);
+        return deep ? std::move(*deep) : walk(columns, *stored, page);
+    }
+    if (stored != nullptr && grams_) {
+        if (page.limit > 0 && isWalkCheaper(*stored, page)) {
+            return walk(columns, *stored, page);
+        }
+        return stored->tail == "rank" ? stream(columns, page) : candidates(columns, *stored, page);
+    }
+    Sql sql = newSql("SELECT ").add(columns);
+    addSource(sql, grams_.has_value());
+    sql.add(" ORDER BY ");
+    if (stored != nullptr) {
+        sql.add(orderText(*stored, "songs."));
+    } else {
+        addFullOrder(sql, order, "songs.");
+    }
+    addPage(sql, page);
+    return sql;
+}
+
+Sql SongPlan::distinctPage(std::string_view columns, const Query &query) {
+    const ColumnInfo &info = columnInfo(*query.distinct);
+    Sql sql = newSql("SELECT ").add(columns);
+    sql.add(" FROM songs WHERE songs.id IN (SELECT min(songs.id)");
+    addSource(sql, grams_.has_value());
+    sql.add(" GROUP BY songs.").add(info.name).add(") ORDER BY ");
+    if (!query.order.empty()) {
+        sql.addOrder(query.order, "songs.");
+        sql.add(", ");
+    }
+    sql.add("songs.").add(info.name).add(", songs.id");
+    addPage(sql, {query.offset, query.limit});
+    return sql;
+}
+
+Sql SongPlan::ids() {
+    Sql sql = newSql("SELECT songs.id");
+    addSource(sql, grams_.has_value());
+    return sql;
+}
+
+/* How many songs have the rarest token of each term, at most; counted at the end of a scan and
+ * good enough to choose by. Tokens that are not on record are rare. */
+std::int64_t SongPlan::estimatedMatches() {
+    std::int64_t sum = 0;
+    for (const SearchTerm &term : terms_) {
+        std::int64_t least = reader_.state().songs;
+        for (const std::string &token : gramsOf(term)) {
+            least = std::min(least, reader_.integer(newSql("SELECT songs FROM gram_counts "
+                                                           "WHERE gram=")
+                                                        .bind(token)));
+        }
+        sum += least;
+    }
+    return std::min(sum, reader_.state().songs);
+}
+
+/* The number of candidates; where there are more than `bound`, what the places of the first of
+ * them say of all. */
+std::int64_t SongPlan::candidatesUpTo(std::int64_t bound) {
+    Sql sql = newSql("SELECT count(*), max(found) FROM (SELECT rowid AS found FROM grams WHERE ");
+    addMatch(sql);
+    sql.add(" ORDER BY rowid LIMIT ").bind(bound).add(")");
+    Using row(reader_.statement(sql));
+    row->step();
+    const std::int64_t count = row->integer(0);
+    if (count < bound) {
+        return count;
+    }
+    const auto last = static_cast<double>(row->integer(1));
+    const auto first = static_cast<double>(reader_.integer(newSql("SELECT min(rank) FROM songs")));
+    const auto end = static_cast<double>(reader_.integer(newSql("SELECT max(rank) FROM songs")));
+    const double share = std::max(1e-6, (last - first) / std::max(1.0, end - first));
+    return static_cast<std::int64_t>(static_cast<double>(count) / share);
+}
+
+bool SongPlan::isWalkCheaper(const StoredOrder &order, Page page) {
+    const bool isStream = order.tail == "rank";
+    if (isStream && !grams_->isShort) {
+        return false;
+    }
+    const auto songs = static_cast<double>(reader_.state().songs);
+    const auto wanted = static_cast<double>(page.offset + page.limit);
+    const double factor = isStream ? kPrefixEntryCost : kFetchCost;
+    const auto walkCost = [&](double matches) {
+        return std::min(songs, wanted * songs / std::max(1.0, matches)) * kFetchCost;
+    };
+    auto matches = static_cast<double>(estimatedMatches());
+    if (matches * factor <= walkCost(matches)) {
+        return false;
+    }
+    if (!isStream && !grams_->isShort) {
+        const auto bound = static_cast<std::int64_t>(std::sqrt(wanted * songs)) + 1;
+        matches = static_cast<double>(candidatesUpTo(std::min<std::int64_t>(bound, 1000)));
+    }
+    return matches * factor > walkCost(matches);
+}
+
+std::int64_t SongPlan::countOutside(const std::string &prefix, std::int64_t bound) {
+    Sql before = newSql("SELECT count(*) FROM (SELECT 1 FROM songs WHERE path<").bind(prefix);
+    before.add(" LIMIT ").bind(bound).add(")");
+    std::int64_t outside = reader_.integer(before);
+    if (const auto end = endOfPrefix(prefix)) {
+        Sql behind = newSql("SELECT count(*) FROM (SELECT 1 FROM songs WHERE path>=").bind(*end);
+        behind.add(" LIMIT ").bind(bound).add(")");
+        outside += reader_.integer(behind);
+    }
+    return outside;
+}
+
+std::int64_t SongPlan::count(std::optional<Column> distinct) {
+    if (conjuncts_.empty() && !distinct) {
+        return reader_.state().songs;
+    }
+    if (conjuncts_.size() == 1 && !conjuncts_[0].pathPrefix.empty() && !distinct) {
+        const auto outside = countOutside(conjuncts_[0].pathPrefix, kOutsideBound);
+        if (outside < kOutsideBound) {
+            return reader_.state().songs - outside;
+        }
+    }
+    if (conjuncts_.empty() && reader_.state().isOrdered) {
+        for (const Facet &facet : facets()) {
+            if (facet.column == *distinct) {
+                return reader_.state().facetCounts.find(facet.state)->second;
+            }
+        }
+    }
+    if (grams_ && grams_->isExact && !distinct) {
+        Sql sql = newSql("SELECT count(*) FROM grams WHERE ");
+        addMatch(sql);
+        return reader_.integer(sql);
+    }
+    Sql sql = newSql("SELECT count(");
+    if (distinct) {
+        sql.add("DISTINCT songs.").add(columnInfo(*distinct).name).add(")");
+    } else {
+        sql.add("*)");
+    }
+    /* Looking at every other song is slower than looking at all of them one after another. */
+    const bool withGrams = grams_ && estimatedMatches() < reader_.state().songs / 3;
+    addSource(sql, withGrams);
+    return reader_.integer(sql);
+}
+
+}  // namespace zano::mediadb::sqlite

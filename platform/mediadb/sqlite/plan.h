@@ -1,0 +1,72 @@
+/* Turns a parsed query on the songs into the statement that answers it fastest.
+ *
+ * Ways to the rows, and when each is taken:
+ *   stream      the search index gives matches in the default order, so a page stops early
+ *   candidates  few matches: fetch them all and sort; for every other order
+ *   walk        many matches: follow the index of the order and keep what matches
+ *   plain       everything else, and while the stored orders are not built: left to SQLite
+ */
+#pragma once
+
+#include <optional>
+
+#include "../query/render.h"
+#include "grams.h"
+#include "reader.h"
+#include "schema.h"
+
+namespace zano::mediadb::sqlite {
+
+const Dialect &dialect();
+
+class SongPlan {
+  public:
+    /* `condition` must outlive the plan. Reads what it needs to know through the reader. */
+    SongPlan(Reader &reader, const std::optional<Expression> &condition);
+
+    /* SELECT `columns` of one page, in order; not for distinct and random queries. */
+    Sql page(std::string_view columns, const Query &query);
+    /* SELECT `columns` of the first song of each value of the distinct column. */
+    Sql distinctPage(std::string_view columns, const Query &query);
+    /* SELECT the ids of all rows, in no order. */
+    Sql ids();
+    std::int64_t count(std::optional<Column> distinct);
+
+    bool isUnconditional() const { return conjuncts_.empty(); }
+
+  private:
+    struct Page {
+        std::int64_t offset;
+        std::int64_t limit;
+    };
+
+    bool coversAllPaths(const std::string &prefix);
+    void findGrams();
+    std::int64_t estimatedMatches();
+    std::int64_t candidatesUpTo(std::int64_t bound);
+    std::int64_t countOutside(const std::string &prefix, std::int64_t bound);
+    bool isWalkCheaper(const StoredOrder &order, Page page);
+
+    void addWhere(Sql &sql, bool withGrams);
+    void addSource(Sql &sql, bool withGrams);
+    void addMatch(Sql &sql);
+    void addPage(Sql &sql, Page page);
+    Sql stream(std::string_view columns, Page page);
+    Sql candidates(std::string_view columns, const StoredOrder &order, Page page);
+    Sql walk(std::string_view columns, const StoredOrder &order, Page page);
+    std::optional<Sql> anchored(std::string_view columns, const StoredOrder &order, Page page);
+
+    Reader &reader_;
+    std::vector<Conjunct> conjuncts_;
+    std::optional<GramQuery> grams_;
+    std::vector<bool> answered_;  // by the search index alone, for each conjunct
+    std::vector<SearchTerm> terms_;
+};
+
+/* ORDER BY text for an order without an index; ties are broken by id. */
+void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier);
+
+/* How many entries of an order lie between two anchors. */
+constexpr std::int64_t kAnchorDistance = 128;
+
+}  // namespace zano::mediadb::sqlite

@@ -1,0 +1,155 @@
+#include "reader.h"
+
+#include <sys/stat.h>
+#include <unistd.h>
+#include <utility>
+
+#include "../engine.h"
+#include "schema.h"
+
+namespace zano::mediadb::sqlite {
+namespace {
+
+constexpr size_t kMaxStatements = 64;
+constexpr size_t kMaxIdleReaders = 4;
+/* Steps of SQLite's machine between two looks at the clock: some microseconds. */
+constexpr int kStepsBetweenLooks = 2000;
+
+}  // namespace
+
+Reader::Reader(const std::string &path) : connection_(openForReading(path)) {
+    restartClock();
+    sqlite3_progress_handler(connection_.get(), kStepsBetweenLooks, checkClock, this);
+}
+
+int Reader::checkClock(void *self) {
+    return std::chrono::steady_clock::now() > static_cast<Reader *>(self)->deadline_ ? 1 : 0;
+}
+
+void Reader::restartClock() {
+    deadline_ = std::chrono::steady_clock::now() + std::chrono::milliseconds(kQueryLimitMs);
+}
+
+void Reader::beginSnapshot() {
+    restartClock();
+    statement("BEGIN").run();
+    Using rows(statement("SELECT name, value FROM state"));
+    while (rows->step()) {
+        const std::string_view name = rows->text(0);
+        const std::int64_t value = rows->integer(1);
+        if (name == "songs") {
+            state_.songs = value;
+        } else if (name == "generation") {
+            state_.generation = value;
+        } else if (name == "anchored") {
+            state_.anchored = value;
+        } else if (name == "ordered") {
+            state_.isOrdered = value != 0;
+        } else if (const auto known = state_.facetCounts.find(name);
+                   known != state_.facetCounts.end()) {
+            known->second = value;
+        } else {
+            state_.facetCounts.emplace(name, value);
+        }
+    }
+}
+
+void Reader::endSnapshot() noexcept {
+    for (auto &[sql, statement] : statements_) {
+        statement.reset();
+    }
+    sqlite3_exec(connection_.get(), "ROLLBACK", nullptr, nullptr, nullptr);
+}
+
+Statement &Reader::statement(const std::string &sql) {
+    if (const auto known = bySql_.find(sql); known != bySql_.end()) {
+        statements_.splice(statements_.begin(), statements_, known->second);
+        return known->second->second;
+    }
+    statements_.emplace_front(sql, connection_.prepare(sql, true));
+    bySql_.emplace(statements_.front().first, statements_.begin());
+    if (statements_.size() > kMaxStatements) {
+        bySql_.erase(statements_.back().first);
+        statements_.pop_back();
+    }
+    return statements_.front().second;
+}
+
+Statement &Reader::statement(const Sql &sql) {
+    Statement &prepared = statement(sql.text());
+    int index = 0;
+    for (const Value &value : sql.values()) {
+        prepared.bindValue(++index, value);
+    }
+    return prepared;
+}
+
+std::int64_t Reader::integer(const Sql &sql, std::int64_t fallback) {
+    Using row(statement(sql));
+    return row->step() && !row->isNull(0) ? row->integer(0) : fallback;
+}
+
+ReaderPool::ReaderPool(std::string path) : path_(std::move(path)) {
+    idle_.reserve(kMaxIdleReaders);
+}
+
+ReaderPool::~ReaderPool() {
+    forgetOthers();
+}
+
+/* Connections must not be used in a process that was forked off, not even to close them. */
+void ReaderPool::forgetOthers() {
+    if (process_ != 0 && process_ != getpid()) {
+        for (auto &reader : idle_) {
+            (void)reader.release();
+        }
+    }
+}
+
+ReaderPool::Lease ReaderPool::lease() {
+    struct stat file {};
+    const bool isThere = stat(path_.c_str(), &file) == 0;
+    std::unique_ptr<Reader> reader;
+    {
+        const std::lock_guard lock(mutex_);
+        if (process_ != getpid()) {
+            forgetOthers();
+            idle_.clear();
+            process_ = getpid();
+        }
+        /* Another file under the same name: a database that was put back from a copy, say. */
+        if (!isThere || file.st_dev != device_ || file.st_ino != inode_) {
+            idle_.clear();
+            device_ = file.st_dev;
+            inode_ = file.st_ino;
+        }
+        if (!idle_.empty()) {
+            reader = std::move(idle_.back());
+            idle_.pop_back();
+        }
+    }
+    if (!reader) {
+        reader = std::make_unique<Reader>(path_);
+    }
+    Lease lease(reader.release(), GiveBack{shared_from_this()});
+    lease->beginSnapshot();
+    return lease;
+}
+
+void ReaderPool::GiveBack::operator()(Reader *reader) const noexcept {
+    pool->giveBack(std::unique_ptr<Reader>(reader), getpid());
+}
+
+void ReaderPool::giveBack(std::unique_ptr<Reader> reader, pid_t process) noexcept {
+    const std::lock_guard lock(mutex_);
+    if (process != process_) {
+        (void)reader.release();
+        return;
+    }
+    reader->endSnapshot();
+    if (idle_.size() < kMaxIdleReaders) {
+        idle_.push_back(std::move(reader));
+    }
+}
+
+}  // namespace zano::mediadb::sqlite

@@ -1,0 +1,89 @@
+/* A connection for reading with what belongs to it, and the pool that keeps idle ones.
+ *
+ * Opening a connection costs more than reading a page, so they are kept, with their prepared
+ * statements. A result that its caller never closes keeps its connection to itself and so holds
+ * back nobody else's view of the database.
+ */
+#pragma once
+
+#include <sys/types.h>
+#include <chrono>
+#include <list>
+#include <map>
+#include <memory>
+#include <mutex>
+#include <string>
+#include <vector>
+
+#include "../query/render.h"
+#include "handle.h"
+
+namespace zano::mediadb::sqlite {
+
+/* What the table `state` said when the snapshot began. */
+struct State {
+    std::int64_t songs = 0;
+    std::int64_t generation = 0;
+    std::int64_t anchored = -1;
+    bool isOrdered = false;
+    std::map<std::string, std::int64_t, std::less<>> facetCounts;
+};
+
+class Reader {
+  public:
+    explicit Reader(const std::string &path);
+
+    /* Everything read between the two is of one moment. */
+    void beginSnapshot();
+    void endSnapshot() noexcept;
+    const State &state() const { return state_; }
+
+    /* Gives what follows the time limit of a query. */
+    void restartClock();
+
+    /* A prepared statement, kept for the next time; it is the caller's until it is reset. */
+    Statement &statement(const std::string &sql);
+    /* The same with its values bound; they must live until it is reset. */
+    Statement &statement(const Sql &sql);
+
+    /* The first column of the first row of a statement; `fallback` when there is none. */
+    std::int64_t integer(const Sql &sql, std::int64_t fallback = 0);
+
+  private:
+    static int checkClock(void *self);
+
+    Connection connection_;
+    std::chrono::steady_clock::time_point deadline_;
+    State state_;
+    std::list<std::pair<std::string, Statement>> statements_;  // the last used first
+    std::map<std::string_view, std::list<std::pair<std::string, Statement>>::iterator> bySql_;
+};
+
+class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
+  public:
+    explicit ReaderPool(std::string path);
+    ~ReaderPool();
+    ReaderPool(const ReaderPool &) = delete;
+    ReaderPool &operator=(const ReaderPool &) = delete;
+
+    /* A reader with a snapshot begun; it goes back when the lease ends. */
+    struct GiveBack {
+        std::shared_ptr<ReaderPool> pool;
+        void operator()(Reader *reader) const noexcept;
+    };
+    using Lease = std::unique_ptr<Reader, GiveBack>;
+    Lease lease();
+
+  private:
+    void forgetOthers();
+    void giveBack(std::unique_ptr<Reader> reader, pid_t process) noexcept;
+
+    std::string path_;
+    std::mutex mutex_;
+    std::vector<std::unique_ptr<Reader>> idle_;
+    pid_t process_ = 0;
+    dev_t device_ = 0;
+    ino_t inode_ = 0;
+};
+
+}  // namespace zano::mediadb::sqlite

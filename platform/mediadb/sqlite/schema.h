@@ -1,0 +1,57 @@
+/* The tables of the media database in SQLite; docs/media-database.md describes them.
+ *
+ * The tables themselves always hold the truth. Beside them stands what makes reading fast: the
+ * ranks of the songs in the two stored orders, the indexes over them, the search index, the
+ * counted artists, albums and genres, and the anchors of deep pages. A first scan builds those
+ * at its end and until then state 'ordered' is 0, which tells readers to do without them.
+ */
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "handle.h"
+
+namespace zano::mediadb::sqlite {
+
+/* Written into the file, so that a file of another program is told apart: "Zmdb". */
+constexpr int kApplicationId = 0x5A6D6462;
+constexpr int kSchemaVersion = 1;
+
+/* Opens for writing. A missing file and its folders are made, an older schema is migrated; a file
+ * that is not a media database, or is from a newer version, is left as it is and throws. */
+Connection openForWriting(const std::string &path);
+
+/* Opens for reading and nothing else: only SELECT, on this program's tables, with a short list of
+ * functions. Throws as above, and when the file is missing. */
+Connection openForReading(const std::string &path);
+
+/* The columns whose distinct values are kept counted. */
+struct Facet {
+    Column column;
+    int number;              // on disk
+    std::string_view state;  // the name of the count of its values
+};
+const std::vector<Facet> &facets();
+
+/* An order that is read from an index. */
+struct StoredOrder {
+    OrderTerm leading;
+    int number;              // on disk, of its anchors
+    std::string_view index;  // "" for the table itself
+    std::string_view key;    // the leading column in the index; "" when tail alone decides
+    std::string_view tail;   // what decides between equal keys
+    bool descending;         // of the index as a whole
+};
+const std::vector<StoredOrder> &storedOrders();
+const StoredOrder *findStoredOrder(const OrderTerm &leading);
+
+/* "key DESC, tail DESC", with a qualifier such as "songs." before each. */
+std::string orderText(const StoredOrder &order, std::string_view qualifier);
+
+/* SQL that drops, and SQL that makes, all indexes of the stored orders but that over paths. */
+std::vector<std::string> dropIndexes();
+std::vector<std::string> createIndexes();
+
+}  // namespace zano::mediadb::sqlite
