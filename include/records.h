@@ -8,8 +8,8 @@
 #ifndef VORELIX_RECORDS_H
 #define VORELIX_RECORDS_H
 
-#include <stddef.h>
-#include <stdint.h>
+#include <stddef.h>  // NOLINT(modernize-deprecated-headers): the header is C too
+#include <stdint.h>  // NOLINT(modernize-deprecated-headers)
 
 #ifdef __cplusplus
 #define VORELIX_STATIC_ASSERT static_assert
