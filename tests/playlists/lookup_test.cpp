@@ -1,0 +1,128 @@
+#include <vorelix/playlists/playlist.h>
+
+#include <algorithm>
+#include <random>
+#include <string>
+#include <vector>
+
+#include "support/platform_stand_in.h"
+
+namespace {
+
+using stand_in::bytes;
+using stand_in::List;
+using stand_in::row;
+using stand_in::script;
+using stand_in::takeTrace;
+
+class Lookup : public stand_in::Test {};
+
+TEST_F(Lookup, SongsInTheOrderOfTheIds) {
+    script().rows = {row(3, "three"), row(7, "seven"), row(-1, "below zero"), row(12, "twelve")};
+    const struct {
+        const char *ids;
+        const char *songs;
+    } cases[] = {
+        {"7,3,7", "7 seven, 3 three"},
+        {"12,99,3", "12 twelve, 3 three"},
+        {"99", ""},
+        {"3 ,7", "7 seven"},
+        {" 3,\t7,+12", "3 three, 7 seven, 12 twelve"},
+        {"3x,x,0x7, ,7", "7 seven"},
+        {",3,,", "3 three"},
+        {"-1,4294967295", "-1 below zero"},
+        {"4294967299,18446744073709551619,3", "-1 below zero, 3 three"},  // 2^32 + 3, 2^64 + 3
+        {"4294967294,-4294967299,7", "-1 below zero, 7 seven"},
+    };
+    for (const auto &each : cases) {
+        List list;
+        EXPECT_EQ(ZANOMusicListGetByID(list.address(), each.ids), 0) << each.ids;
+        EXPECT_EQ(list.text(), each.songs) << each.ids;
+        EXPECT_EQ(takeTrace(), "open(0, \"*\", \"id in (" + std::string(each.ids) +
+                                   ")\", null, null, 0, 0, 0)\nclose\n");
+    }
+}
+
+TEST_F(Lookup, AnEmptyItemIsIdZero) {
+    script().rows = {row(0, "zero"), row(1, "one")};
+    List list;
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), "1,,2"), 0);
+    EXPECT_EQ(list.text(), "1 one, 0 zero");
+}
+
+TEST_F(Lookup, CopiesTheWholeRow) {
+    ZANO_MEDIA_INFO full;
+    std::fill_n(reinterpret_cast<unsigned char *>(&full), sizeof full, 0xA5);
+    full.id = 5;
+    script().rows = {full};
+    List list;
+    ASSERT_EQ(ZANOMusicListGetByID(list.address(), "5"), 0);
+    ASSERT_NE(list.head(), nullptr);
+    EXPECT_EQ(bytes(list.head()->info), bytes(full));
+    EXPECT_EQ(list.head()->next, nullptr);
+}
+
+/* Whatever makes lookups quick must place nodes as a plain walk over the fetched list does: the
+ * last row first, each node once. */
+TEST_F(Lookup, PlacesNodesAsAPlainWalkDoes) {
+    std::mt19937 random(20240601);
+    for (int round = 0; round < 30; ++round) {
+        const int range = round % 2 == 0 ? 40 : 20000;  // many rows of one id, or few
+        const int step = round % 3 == 0 ? 4096 : 1;
+        std::vector<ZANO_MEDIA_INFO> walked;
+        walked.reserve(300);
+        for (int index = 0; index < 300; ++index) {
+            walked.push_back(row(static_cast<int>(random() % static_cast<unsigned>(range)) * step,
+                                 std::to_string(index)));
+        }
+        script().rows.assign(walked.rbegin(), walked.rend());
+
+        std::string ids;
+        std::string expected;
+        for (int index = 0; index < 400; ++index) {
+            const int id = walked.empty() || index % 5 == 0
+                               ? static_cast<int>(random() % static_cast<unsigned>(range)) * step
+                               : walked[random() % walked.size()].id;
+            ids += (ids.empty() ? "" : ",") + std::to_string(id);
+            const auto found = std::find_if(walked.begin(), walked.end(),
+                                            [id](const auto &each) { return each.id == id; });
+            if (found != walked.end()) {
+                expected +=
+                    (expected.empty() ? "" : ", ") + std::to_string(id) + " " + found->title;
+                walked.erase(found);
+            }
+        }
+        List list;
+        ASSERT_EQ(ZANOMusicListGetByID(list.address(), ids.c_str()), 0);
+        ASSERT_EQ(list.text(), expected) << "round " << round;
+    }
+}
+
+TEST_F(Lookup, BadParameters) {
+    List list;
+    EXPECT_EQ(ZANOMusicListGetByID(nullptr, "1"), -1);
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), nullptr), -1);
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), ""), -1);
+    const std::string line = "3 playlist.cpp (97) Bad parameter.\n";
+    EXPECT_EQ(takeTrace(), line + line + line);
+}
+
+TEST_F(Lookup, FailedOpen) {
+    script().openFails = true;
+    List list;
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), "1,'x"), -1);
+    EXPECT_EQ(list.head(), nullptr);
+    EXPECT_EQ(takeTrace(),
+              "open(0, \"*\", \"id in (1,'x)\", null, null, 0, 0, 0)\n"
+              "3 playlist.cpp (113) Failed to open media database (id in (1,'x)).\n");
+}
+
+TEST_F(Lookup, WithoutTheStringListNothingIsPlaced) {
+    script().rows = {row(3, "three")};
+    script().stringListFails = true;
+    List list;
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), "3"), 0);
+    EXPECT_EQ(list.head(), nullptr);
+}
+
+}  // namespace

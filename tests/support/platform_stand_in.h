@@ -1,0 +1,72 @@
+/* Takes the place of the media database, of the music link and of the system log.
+ *
+ * A test program that compiles platform_stand_in.cpp in supplies these functions itself, and the
+ * library reaches them over the dynamic symbol table, as it reaches the platform. The escaping
+ * functions and the string list stay the platform's own, but can be told to fail. What the
+ * library asks for and logs is kept as text, one line for each call:
+ *
+ *     open(0, "*", null, null, "RANDOM()", 0, 50, 0)
+ *     close
+ *     count(0, "id", null, 0, 0)
+ *     3 musiclib.cpp (84) Bad parameter.
+ */
+#pragma once
+
+#include <gtest/gtest.h>
+#include <vorelix/records.h>
+
+#include <string>
+#include <vector>
+
+namespace stand_in {
+
+/* What the stand-ins answer. */
+struct Script {
+    std::vector<ZANO_MEDIA_INFO> rows;
+    int rowCount = 0;  // the fourth field of a result
+    int count = 0;     // the answer of MediaInfoDBGetCount
+    bool openFails = false;
+    std::string musicRoot = "/volume1/music";
+    int linkError = 0;  // errno of a music link that cannot be read
+    bool quotesFail = false;
+    bool backslashesFail = false;
+    bool templateFails = false;
+    bool stringListFails = false;
+};
+Script &script();
+
+/* The calls since the last one, a line feed behind each. */
+std::string takeTrace();
+
+/* The number of results that were opened and not closed; counts from 0 again after it. */
+int takeOpenResults();
+
+/* A row with an id and a title; the title also stands in the path. */
+ZANO_MEDIA_INFO row(int id, const std::string &title);
+
+/* All of a row, to compare. */
+std::string bytes(const ZANO_MEDIA_INFO &row);
+
+/* A list head that releases its list; text() is "id title, id title". */
+class List {
+  public:
+    List() = default;
+    ~List();
+    List(const List &) = delete;
+    List &operator=(const List &) = delete;
+    ZANO_PLAYLIST_REC **address() { return &head_; }
+    const ZANO_PLAYLIST_REC *head() const { return head_; }
+    std::string text() const;
+
+  private:
+    ZANO_PLAYLIST_REC *head_ = nullptr;
+};
+
+/* Starts from a new script; at the end no result may be open. */
+class Test : public testing::Test {
+  protected:
+    Test();
+    void TearDown() override;
+};
+
+}  // namespace stand_in
