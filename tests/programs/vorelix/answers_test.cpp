@@ -1,0 +1,117 @@
+#include <gtest/gtest.h>
+#include <cstring>
+
+#include "commands.h"
+#include "json.h"
+#include "numbers.h"
+#include "paging.h"
+
+namespace vorelix {
+namespace {
+
+TEST(PageLine, SaysWhereAndHowToGoOn) {
+    const struct {
+        std::vector<std::string> words;
+        Span span;
+        bool byPage;
+        int shown;
+        int total;
+        const char *line;
+    } cases[] = {
+        {{"vorelix", "list"},
+         {0, 50},
+         true,
+         50,
+         1234,
+         "songs 1-50 of 1234 (page 1 of 25; next: vorelix list --page 2)"},
+        {{"vorelix", "list", "--page", "2"},
+         {50, 50},
+         true,
+         50,
+         100,
+         "songs 51-100 of 100 (page 2 of 2)"},
+        {{"vorelix", "list", "--page", "25"},
+         {1200, 50},
+         true,
+         34,
+         1234,
+         "songs 1201-1234 of 1234 (page 25 of 25)"},
+        {{"vorelix", "list"}, {0, 50}, true, 50, 50, "songs 1-50 of 50"},
+        {{"vorelix", "list", "--page=3"},
+         {100, 50},
+         true,
+         0,
+         60,
+         "no songs here: there are 60 in all, on pages 1 to 2"},
+        {{"vorelix", "--json", "list", "--desc", "--page=2"},
+         {50, 50},
+         true,
+         50,
+         151,
+         "songs 51-100 of 151 (page 2 of 4; next: vorelix --json list --page 3 --desc)"},
+        {{"./my bin/vorelix", "list", "--offset", "3", "--limit", "2"},
+         {3, 2},
+         false,
+         2,
+         9,
+         "songs 4-5 of 9 (next: './my bin/vorelix' list --offset 5 --limit 2)"},
+        {{"vorelix", "list", "--", "--page", "it's \x1b"},
+         {0, 5},
+         true,
+         5,
+         6,
+         "songs 1-5 of 6 (page 1 of 2; next: vorelix list --page 2 -- --page 'it'\\''s ␛')"},
+        {{"vorelix", "list"},
+         {2147483600, 10000},
+         false,
+         0,
+         2147483647,
+         "no songs here: there are 2147483647 in all"},
+    };
+    for (const auto &row : cases) {
+        Request request;
+        request.command = &allCommands().front();
+        request.words = row.words;
+        request.span = row.span;
+        request.byPage = row.byPage;
+        EXPECT_EQ(pageLine("songs", request, row.shown, row.total), row.line);
+    }
+}
+
+TEST(Json, PathsThatAreNotUtf8AreWhole) {
+    ZANO_MEDIA_INFO song{};
+    std::strcpy(song.path, "/m/\xe9t\xe9.mp3");
+    std::strcpy(song.title, "a\"b\\\x1b\xff");
+    song.duration = 187.2459F;
+    const Json::Value object = songObject(song);
+    EXPECT_EQ(object["path"], "/m/\xEF\xBF\xBDt\xEF\xBF\xBD.mp3");
+    EXPECT_EQ(object["pathBytes"], "L20v6XTpLm1wMw==");
+    EXPECT_EQ(object["title"], "a\"b\\\x1b\xEF\xBF\xBD");
+    const std::string text = documentOf(object);
+    EXPECT_NE(text.find("\"duration\" : 187.246,"), std::string::npos) << text;
+    EXPECT_NE(text.find("\\u001b"), std::string::npos) << text;
+    EXPECT_FALSE(songObject(ZANO_MEDIA_INFO{}).isMember("pathBytes"));
+}
+
+TEST(Json, Base64) {
+    const std::pair<const char *, const char *> cases[] = {
+        {"", ""}, {"f", "Zg=="}, {"fo", "Zm8="}, {"foo", "Zm9v"}, {"\xff\xfe\xfd!", "//79IQ=="}};
+    for (const auto &[bytes, text] : cases) {
+        EXPECT_EQ(base64(bytes), text);
+    }
+}
+
+TEST(Numbers, AsPeopleReadThem) {
+    EXPECT_EQ(durationText(0), "");
+    EXPECT_EQ(durationText(5), "0:05");
+    EXPECT_EQ(durationText(59.6), "1:00");
+    EXPECT_EQ(durationText(3599.4), "59:59");
+    EXPECT_EQ(durationText(3723), "1:02:03");
+    EXPECT_EQ(durationText(-1), "");
+    EXPECT_EQ(bitrateText(320000), "320 kbit/s");
+    EXPECT_EQ(frequencyText(44100), "44.1 kHz");
+    EXPECT_EQ(frequencyText(48000), "48 kHz");
+}
+
+}  // namespace
+}  // namespace vorelix
