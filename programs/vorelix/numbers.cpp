@@ -11,8 +11,9 @@ constexpr int kSecondsOfMinute = 60;
 constexpr int kMinutesOfHour = 60;
 constexpr int kKilo = 1000;
 
-std::string twoDigits(long long number) {
-    return (number < 10 ? "0" : "") + std::to_string(number);
+/* ":05" */
+void appendTwoDigits(std::string &text, long long number) {
+    text.append(number < 10 ? ":0" : ":").append(std::to_string(number));
 }
 
 }  // namespace
@@ -26,13 +27,16 @@ std::string durationText(double seconds) {
         return {};
     }
     const long long all = std::llround(seconds);
-    const std::string rest = ":" + twoDigits(all % kSecondsOfMinute);
     const long long minutes = all / kSecondsOfMinute;
+    std::string text;
     if (minutes < kMinutesOfHour) {
-        return std::to_string(minutes) + rest;
+        text = std::to_string(minutes);
+    } else {
+        text = std::to_string(minutes / kMinutesOfHour);
+        appendTwoDigits(text, minutes % kMinutesOfHour);
     }
-    return std::to_string(minutes / kMinutesOfHour) + ":" + twoDigits(minutes % kMinutesOfHour) +
-           rest;
+    appendTwoDigits(text, all % kSecondsOfMinute);
+    return text;
 }
 
 std::string bitrateText(int bitsPerSecond) {

@@ -33,7 +33,7 @@ std::string nextCommand(const Request &request, int nextOffset) {
     words.insert(command + 1, {option, std::to_string(number)});
     std::string line;
     for (const std::string &word : words) {
-        line += (line.empty() ? "" : " ") + shellQuoted(word);
+        line.append(line.empty() ? "" : " ").append(shellQuoted(word));
     }
     return printable(line);
 }

@@ -25,7 +25,7 @@ std::vector<int> unknownIds(const std::vector<int> &ids, const ZANO_PLAYLIST_REC
 std::string complaintAbout(const std::vector<int> &unknown) {
     std::string text;
     for (const int id : unknown) {
-        text += (text.empty() ? "no song has the id " : ", ") + std::to_string(id);
+        text.append(text.empty() ? "no song has the id " : ", ").append(std::to_string(id));
     }
     return text.empty() ? text : text + "; the listings show the ids that exist";
 }
@@ -76,7 +76,7 @@ Outcome showCommand(const Request &request, const Terminal &) {
         return outcome;
     }
     for (const auto *song = songs.get(); song != nullptr; song = song->next) {
-        outcome.text += (outcome.text.empty() ? "" : "\n") + detailsOf(song->info);
+        outcome.text.append(outcome.text.empty() ? "" : "\n").append(detailsOf(song->info));
     }
     return outcome;
 }

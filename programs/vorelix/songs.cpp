@@ -128,7 +128,7 @@ Listing listValues(const std::string &column, const Filter &filter, const Order 
 SongList songsById(const std::vector<int> &ids) {
     std::string text;
     for (const int id : ids) {
-        text += (text.empty() ? "" : ",") + std::to_string(id);
+        text.append(text.empty() ? "" : ",").append(std::to_string(id));
     }
     ZANO_PLAYLIST_REC *list = nullptr;
     if (ZANOMusicListGetByID(&list, text.c_str()) != 0) {
