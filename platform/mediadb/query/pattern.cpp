@@ -71,6 +71,36 @@ std::optional<std::string_view> Pattern::part() const {
                : std::nullopt;
 }
 
+/* When a piece does not fit, only the last % can take more: the pieces before it have found their
+ * first places, and later ones could not do better. */
+bool Pattern::matches(std::string_view text) const {
+    size_t piece = 0;
+    std::optional<size_t> lastAnyText;
+    std::string_view lastRest;
+    std::string_view rest = text;
+    for (;;) {
+        if (piece == pieces_.size() && rest.empty()) {
+            return true;
+        }
+        if (isAnyText(piece)) {
+            lastAnyText = piece++;
+            lastRest = rest;
+        } else if (isLiteral(piece) &&
+                   rest.substr(0, pieces_[piece].text.size()) == pieces_[piece].text) {
+            rest.remove_prefix(pieces_[piece++].text.size());
+        } else if (piece < pieces_.size() && !isLiteral(piece) && !rest.empty()) {
+            takeCharacter(rest);
+            ++piece;
+        } else if (lastAnyText && !lastRest.empty()) {
+            takeCharacter(lastRest);
+            rest = lastRest;
+            piece = *lastAnyText + 1;
+        } else {
+            return false;
+        }
+    }
+}
+
 std::string Pattern::likeText() const {
     std::string text;
     for (const Piece &piece : pieces_) {

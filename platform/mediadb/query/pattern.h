@@ -28,6 +28,9 @@ class Pattern {
     std::optional<std::string_view> prefix() const;
     std::optional<std::string_view> part() const;
 
+    /* Whether a text is matched, in time proportional to text and pattern at the worst. */
+    bool matches(std::string_view text) const;
+
     /* The pattern as text again, with \ as its escape character. */
     std::string likeText() const;
 

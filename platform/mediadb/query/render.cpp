@@ -164,13 +164,11 @@ void Sql::addLike(const Expression &expression, std::string_view qualifier) {
                !expression.ignoreCase) {
         addPathRange(*pattern.prefix(), qualifier);
     } else {
-        std::string like = pattern.likeText();
-        if (like.size() > dialect_->maxPatternBytes) {
-            throw QueryError("the query has a pattern of more than " +
-                             std::to_string(dialect_->maxPatternBytes) + " bytes");
-        }
+        const bool isFunction = !dialect_->like.empty();
+        add(dialect_->like).add(isFunction ? "(" : "");
         addSubject();
-        add(" LIKE ").bind(std::move(like)).add(" ESCAPE '\\'");
+        add(isFunction ? "," : " LIKE ").bind(pattern.likeText());
+        add(isFunction ? ")" : " ESCAPE '\\'");
     }
 }
 

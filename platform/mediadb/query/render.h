@@ -18,8 +18,8 @@ struct Dialect {
     std::string_view fold;
     std::string_view lower;
     std::string_view length;
-    /* The longest LIKE pattern the engine takes, in bytes. */
-    size_t maxPatternBytes;
+    /* A function of text and pattern with the meaning of LIKE; "" for the engine's own LIKE. */
+    std::string_view like;
 };
 
 /* A statement being put together: its text and its values. */

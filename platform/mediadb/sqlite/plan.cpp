@@ -24,7 +24,8 @@ Sql newSql(std::string_view text) {
 }  // namespace
 
 const Dialect &dialect() {
-    static constexpr Dialect kDialect{'?', "instr", "zano_fold", "zano_lower", "length", 50000};
+    static constexpr Dialect kDialect{'?',          "instr",  "zano_fold",
+                                      "zano_lower", "length", "zano_like"};
     return kDialect;
 }
 

@@ -58,8 +58,8 @@ constexpr std::array<std::string_view, 13> kReadableTables = {
     "state",     "grams",         "grams_data",   "grams_idx", "grams_config",
     "json_each", "sqlite_master", "grams_docsize"};
 constexpr std::array<std::string_view, 15> kCallableFunctions = {
-    "instr", "like",  "zano_fold", "zano_lower", "length",    "count", "min",  "max",
-    "-",     "match", "fts5",      "json_each",  "json_type", "abs",   "total"};
+    "instr", "zano_like", "zano_fold", "zano_lower", "length",    "count", "min",  "max",
+    "-",     "match",     "fts5",      "json_each",  "json_type", "abs",   "total"};
 
 int authorize(void *, int action, const char *first, const char *second, const char *,
               const char *) {
@@ -76,10 +76,10 @@ int authorize(void *, int action, const char *first, const char *second, const c
         case SQLITE_FUNCTION:
             return isIn(kCallableFunctions, second) ? SQLITE_OK : SQLITE_DENY;
         case SQLITE_UPDATE:
-        /* How SQLite declares a virtual table to itself; the connection cannot write. */
-        return first != nullptr && std::string_view(first) == "sqlite_master" ? SQLITE_OK
-                                                                              : SQLITE_DENY;
-    case SQLITE_PRAGMA:
+            /* How SQLite declares a virtual table to itself; the connection cannot write. */
+            return first != nullptr && std::string_view(first) == "sqlite_master" ? SQLITE_OK
+                                                                                  : SQLITE_DENY;
+        case SQLITE_PRAGMA:
             return first != nullptr && std::string_view(first) == "data_version" ? SQLITE_OK
                                                                                  : SQLITE_DENY;
         default:
@@ -103,6 +103,26 @@ void textFunction(sqlite3_context *context, int, sqlite3_value **arguments) {
     }
 }
 
+/* SQLite's own LIKE can take hours for one text where a pattern has many %, and cannot be
+ * interrupted meanwhile. The pattern is read once for a statement. */
+void likeFunction(sqlite3_context *context, int, sqlite3_value **arguments) {
+    try {
+        auto *pattern = static_cast<Pattern *>(sqlite3_get_auxdata(context, 1));
+        std::unique_ptr<Pattern> read;
+        if (pattern == nullptr) {
+            read = std::make_unique<Pattern>(textOf(arguments[1]), false);
+            pattern = read.get();
+        }
+        sqlite3_result_int(context, pattern->matches(textOf(arguments[0])) ? 1 : 0);
+        if (read) {
+            sqlite3_set_auxdata(context, 1, read.release(),
+                                [](void *held) { delete static_cast<Pattern *>(held); });
+        }
+    } catch (const std::bad_alloc &) {
+        sqlite3_result_error_nomem(context);
+    }
+}
+
 void prepareForUse(Connection &connection) {
     sqlite3 *database = connection.get();
     sqlite3_busy_timeout(database, kBusyTimeoutMs);
@@ -111,9 +131,9 @@ void prepareForUse(Connection &connection) {
                                nullptr, nullptr, nullptr);
     sqlite3_create_function_v2(database, "zano_lower", 1, kFlags, nullptr, textFunction<lowerCase>,
                                nullptr, nullptr, nullptr);
+    sqlite3_create_function_v2(database, "zano_like", 2, kFlags, nullptr, likeFunction, nullptr,
+                               nullptr, nullptr);
     addGramTokenizer(connection);
-    /* Patterns of `like` are exact; those of `ilike` meet folded keys. */
-    connection.run("PRAGMA case_sensitive_like=ON");
 }
 
 void checkVersion(Connection &connection, const std::string &path) {

@@ -1,0 +1,95 @@
+/* How SQLite goes about the statements of the listings: no page sorts the songs. */
+#include "mediadb/sqlite/plan.h"
+#include "fixture.h"
+#include "mediadb/query/parse.h"
+
+namespace zano::mediadb::sqlite {
+namespace {
+
+class PlanTest : public MediaDatabaseTest {
+  protected:
+    PlanTest() {
+        auto catalogue = openCatalogue(location());
+        std::vector<Song> songs;
+        for (int i = 0; i < 3000; ++i) {
+            Song made = song("/music/" + std::to_string(i), "Title " + std::to_string(i));
+            made.artist = "Artist " + std::to_string(i % 50);
+            made.year = 1950 + i % 70;
+            songs.push_back(made);
+        }
+        put(*catalogue, songs);
+        pool_ = std::make_shared<ReaderPool>(databasePath());
+    }
+
+    std::string planOf(const char *condition, const std::string &order, Query query) {
+        auto reader = pool_->lease();
+        const auto parsed = parseCondition(Table::Songs, condition);
+        parseOrder(order.c_str(), query);
+        Sql sql = SongPlan(*reader, parsed).page("songs.id, songs.title", query);
+        Sql explain(dialect());
+        explain.add("EXPLAIN QUERY PLAN ").add(sql.text());
+        Statement &rows = reader->statement(explain.text());
+        int index = 0;
+        for (const Value &value : sql.values()) {
+            rows.bindValue(++index, value);
+        }
+        std::string plan;
+        while (rows.step()) {
+            plan.append(rows.text(3)).append("; ");
+        }
+        return plan;
+    }
+
+    std::shared_ptr<ReaderPool> pool_;
+};
+
+const std::vector<std::string> &orders() {
+    static const std::vector<std::string> all = [] {
+        std::vector<std::string> made;
+        const std::string tail = ", album, disc, track, title, artist, genre, year, path, duration";
+        for (const char *leading : {"lower(title)", "lower(artist)", "lower(album)", "lower(genre)",
+                                    "year", "duration", "path", "id", "title", "artist"}) {
+            made.push_back(leading + (" " + tail));
+            made.push_back(leading + (" desc" + tail));
+        }
+        return made;
+    }();
+    return all;
+}
+
+TEST_F(PlanTest, APageComesFromAnIndexAtAnyDepth) {
+    for (const std::string &order : orders()) {
+        for (const int offset : {0, 1500, 2999}) {
+            Query query;
+            query.limit = 50;
+            query.offset = offset;
+            const std::string plan = planOf("path like '/music/%'", order, query);
+            EXPECT_EQ(plan.find("TEMP B-TREE"), std::string::npos) << order << ": " << plan;
+            const bool isById = order.substr(0, 2) == "id";
+            EXPECT_TRUE(isById || plan.find("INDEX songs_by_") != std::string::npos)
+                << order << ": " << plan;
+            if (offset > 0) {
+                EXPECT_NE(plan.find("SEARCH songs"), std::string::npos) << order << ": " << plan;
+            }
+        }
+    }
+}
+
+TEST_F(PlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
+    for (const std::string &order : orders()) {
+        Query query;
+        query.limit = 50;
+        const std::string rare = planOf("title ilike '%title 1234%'", order, query);
+        EXPECT_NE(rare.find("SCAN grams VIRTUAL TABLE INDEX"), std::string::npos)
+            << order << ": " << rare;
+        const std::string common = planOf("title ilike '%title%'", order, query);
+        const bool isDefault = order.find("title)") != std::string::npos || order[0] == 't';
+        if (!isDefault || order.find("desc") != std::string::npos) {
+            EXPECT_NE(common.find("SCAN songs"), std::string::npos) << order << ": " << common;
+        }
+        EXPECT_EQ(common.find("TEMP B-TREE"), std::string::npos) << order << ": " << common;
+    }
+}
+
+}  // namespace
+}  // namespace zano::mediadb::sqlite

@@ -1,0 +1,261 @@
+/* Texts come from outside: whatever they are, the database stays as it is. And files that are
+ * not what they should be are refused. */
+#include <sqlite3.h>
+
+#include <cstring>
+#include <sstream>
+
+#include "fixture.h"
+#include "mediadb/sqlite/handle.h"
+
+namespace zano::mediadb {
+namespace {
+
+std::string contentsOf(const std::string &path) {
+    std::ostringstream text;
+    text << std::ifstream(path, std::ios::binary).rdbuf();
+    return text.str();
+}
+
+class SafetyTest : public MediaDatabaseTest {
+  protected:
+    void fill() {
+        auto catalogue = openCatalogue(location());
+        put(*catalogue, {song("/music/a", "One"), song("/music/b", "Two"),
+                         song("/music/c", std::string(4000, 'a'))});
+    }
+};
+
+TEST_F(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
+    fill();
+    const std::vector<std::string> conditions = {
+        "1=1; drop table songs",
+        "1=1; delete from songs",
+        "id=1 union select * from sqlite_master",
+        "id in (select id from songs)",
+        "id=(with recursive c(x) as (select 1 union all select x+1 from c) select x from c)",
+        "load_extension('/tmp/x.so')",
+        "load_extension('/tmp/x.so')=1",
+        "writefile('/tmp/x','y')=1",
+        "fts3_tokenizer('x')='y'",
+        "randomblob(1000000000)=1",
+        "zeroblob(1000000000)=''",
+        "sqlite_version()='3'",
+        "exists(select 1)",
+        "(update songs set title='x')",
+        "id=1 returning id",
+        "title='x",
+        "title=\"x\"",
+        "title=[x]",
+        "title=`x`",
+        "title='x' --",
+        "title='x' /* */",
+        "title=?1",
+        "title=:name",
+        "title=x'00'",
+        "title=char(0)",
+        "main.songs.id=1",
+        "rowid=1",
+        "rank=1",
+        "title_key='x'",
+        "pragma_user_version=1",
+        "grams match 'x'",
+        "title glob '*'",
+        "title regexp 'a'",
+        "title collate nocase='x'",
+        "case when 1=1 then 1 end",
+        "cast(id as text)='1'",
+        "id=1 order by id",
+        "id=1 limit 1",
+        "id=1)",
+        "(id=1",
+        "id",
+        "id=",
+        "=1",
+        "and",
+        "title like",
+        "title like title",
+        "title ilike '%a' or",
+        " ilike '%x%'",
+        "id in ()",
+        "id in (1,2",
+        "id in (1,abc)",
+        "id=1e5",
+        "id=0x10",
+        "id=1abc",
+        "id=99999999999999999999999999999999999999999.x",
+        "id between 1",
+        "id is 1",
+        std::string(5000, '('),
+        std::string(5000, '(') + "id=1" + std::string(5000, ')'),
+        [] {
+            std::string deep;
+            for (int i = 0; i < 5000; ++i) {
+                deep += "not ";
+            }
+            return deep + "id=1";
+        }(),
+    };
+    const std::string before = contentsOf(databasePath());
+    for (const std::string &condition : conditions) {
+        for (const int table : {0, 3, 4}) {
+            EXPECT_EQ(MediaInfoDBOpen(table, "*", condition.c_str(), nullptr, nullptr, 0, 50, 0),
+                      nullptr)
+                << condition.substr(0, 80);
+            EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_QUERY);
+            EXPECT_STRNE(KLIBCErrTextGet(), "");
+        }
+        EXPECT_EQ(MediaInfoDBGetCount(0, "*", condition.c_str(), 0, 0), -1);
+    }
+    for (const char *other :
+         {"*, (select 1)", "id, *", "count(*)", "title as id", "x", "id;", "'text'", "title as"}) {
+        EXPECT_EQ(MediaInfoDBOpen(0, other, nullptr, nullptr, nullptr, 0, 0, 0), nullptr) << other;
+    }
+    for (const char *other :
+         {"id; drop table songs", "(select 1)", "random", "RANDOM(1)", "lower(title", "lower()",
+          "title sideways", "upper(title)", "1", "title,", "abs(id)", "title collate nocase"}) {
+        EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, nullptr, other, 0, 0, 0), nullptr) << other;
+        EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, other, nullptr, 0, 0, 0), nullptr) << other;
+    }
+    EXPECT_EQ(MediaInfoDBOpen(7, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
+    EXPECT_EQ(MediaInfoDBOpen(-1, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
+    EXPECT_TRUE(before == contentsOf(databasePath())) << "the database file changed";
+    EXPECT_EQ(rows(nullptr, "path").size(), 3U);
+}
+
+/* SQLite's own matching would not come back from the first of these. */
+TEST_F(SafetyTest, HostilePatternsAndLongTextsAreAnswered) {
+    fill();
+    std::string percents;
+    for (int i = 0; i < 40; ++i) {
+        percents += "a%";
+    }
+    EXPECT_EQ(rows(("title ilike '%" + percents + "b'").c_str(), "path").size(), 0U);
+    EXPECT_EQ(rows(("title like '%" + percents + "'").c_str(), "path").size(), 1U);
+    EXPECT_EQ(found(std::string(3999, 'a')).size(), 1U);
+    EXPECT_EQ(found(std::string(10000, 'a')).size(), 0U);
+    EXPECT_EQ(found(std::string(100000, '_')).size(), 0U);
+    EXPECT_EQ(found("\xFF\xFE\xC3").size(), 0U);
+    EXPECT_EQ(rows("title like '%\\'", "path").size(), 0U);
+    std::string ids = "1";
+    for (int i = 2; i < 3000; ++i) {
+        ids += "," + std::to_string(i);
+    }
+    EXPECT_EQ(rows(("id in (" + ids + ")").c_str(), "path").size(), 3U);
+}
+
+TEST_F(SafetyTest, ConditionsMeanWhatTheySay) {
+    fill();
+    const std::vector<std::pair<const char *, size_t>> cases = {{"id=1", 1},
+                                                                {" id = 2 ", 1},
+                                                                {"id<>2", 2},
+                                                                {"id!=2", 2},
+                                                                {"id>=2 and id<=3", 2},
+                                                                {"id<2 or id>2", 2},
+                                                                {"not (id=1)", 2},
+                                                                {"id between 2 and 3", 2},
+                                                                {"id not between 2 and 3", 1},
+                                                                {"id in (1,3,99)", 2},
+                                                                {"id not in (1)", 2},
+                                                                {"title='One'", 1},
+                                                                {"title='one'", 0},
+                                                                {"lower(title)='one'", 1},
+                                                                {"title like 'one'", 0},
+                                                                {"title ilike 'ONE'", 1},
+                                                                {"title not ilike 'one'", 2},
+                                                                {"length(title)=3", 2},
+                                                                {"title is null", 0},
+                                                                {"title is not null", 3},
+                                                                {"1=1", 3},
+                                                                {"1=2", 0},
+                                                                {"title='it''s'", 0},
+                                                                {"path like '/music/_'", 3},
+                                                                {"path like '/MUSIC/%'", 0},
+                                                                {"id=-1", 0},
+                                                                {"year < 0.5", 3},
+                                                                {"TITLE='One' AND ID=1", 1},
+                                                                {"", 3},
+                                                                {"  ", 3}};
+    for (const auto &[condition, count] : cases) {
+        EXPECT_EQ(rows(condition, "path").size(), count) << condition;
+        EXPECT_EQ(MediaInfoDBGetCount(0, "*", condition, 0, 0), static_cast<int>(count))
+            << condition;
+    }
+}
+
+TEST_F(SafetyTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
+    const auto refused = [this](int code, const std::string &what) {
+        const std::string before = contentsOf(databasePath());
+        EXPECT_EQ(rows(nullptr, nullptr)[0].substr(0, 7), "failed:") << what;
+        EXPECT_EQ(KLIBCErrGet(), code) << what << KLIBCErrTextGet();
+        try {
+            openCatalogue(location());
+            ADD_FAILURE() << what << " was opened for writing";
+        } catch (const DatabaseError &error) {
+            EXPECT_EQ(error.code(), code) << what << error.what();
+        }
+        EXPECT_TRUE(before == contentsOf(databasePath())) << what;
+    };
+    EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
+    EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_OPEN) << "a missing file";
+    EXPECT_FALSE(std::filesystem::exists(databasePath())) << "reading made a file";
+
+    std::ofstream(databasePath()) << "This is not a database, but it is long enough to be read.\n"
+                                  << std::string(4096, 'x');
+    refused(KLIB_ERR_DATABASE_OPEN, "a text file");
+
+    std::filesystem::remove(databasePath());
+    sqlite::Connection(databasePath(), sqlite::Connection::Mode::Create)
+        .run("CREATE TABLE songs(id INTEGER)");
+    refused(KLIB_ERR_DATABASE_OPEN, "a database of another program");
+
+    std::filesystem::remove(databasePath());
+    openCatalogue(location()).reset();
+    sqlite::Connection(databasePath(), sqlite::Connection::Mode::ReadWrite)
+        .run("PRAGMA user_version=99; PRAGMA wal_checkpoint(TRUNCATE)");
+    refused(KLIB_ERR_DATABASE_VERSION, "a database of a newer version");
+
+    setSetting("mysql://localhost/x");
+    EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
+    EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_CONFIGURATION);
+}
+
+/* A reader whose user may not write in the folder, when the writer is long gone. */
+TEST_F(SafetyTest, ADatabaseIsReadableWithoutTheRightToWrite) {
+    fill();
+    std::filesystem::permissions(databasePath(), std::filesystem::perms::owner_read);
+    EXPECT_EQ(rows(nullptr, "path").size(), 3U);
+    EXPECT_TRUE(std::filesystem::exists(databasePath() + "-wal"));
+}
+
+TEST_F(SafetyTest, AResultSeesOneMomentAndBlocksNobody) {
+    fill();
+    MEDIA_DB_RESULT *result = MediaInfoDBOpen(0, "*", nullptr, nullptr, "path", 0, 0, 0);
+    ASSERT_NE(result, nullptr);
+    auto catalogue = openCatalogue(location());
+    put(*catalogue, {song("/music/d", "Four")});
+    EXPECT_EQ(rows(nullptr, "path").size(), 4U);
+    auto record = std::make_unique<ZANO_MEDIA_INFO>();
+    int count = 0;
+    while (MediaInfoDBGet(result, record.get()) == 0) {
+        ++count;
+    }
+    EXPECT_EQ(count, 3);
+    EXPECT_EQ(result->rowCount, 3);
+    MediaInfoDBClose(result);
+}
+
+/* A database that was put back from a copy is another file under the same name. */
+TEST_F(SafetyTest, AReplacedDatabaseIsNoticed) {
+    fill();
+    EXPECT_EQ(rows(nullptr, "path").size(), 3U);
+    for (const char *suffix : {"", "-wal", "-shm"}) {
+        std::filesystem::remove(databasePath() + suffix);
+    }
+    auto catalogue = openCatalogue(location());
+    put(*catalogue, {song("/other/x", "X")});
+    EXPECT_EQ(rows(nullptr, "path"), std::vector<std::string>{"/other/x"});
+}
+
+}  // namespace
+}  // namespace zano::mediadb
