@@ -1,5 +1,11 @@
 # libvorelix.so, from the units, with what an outside build needs to find it.
 
+# Where the platform library is another one, the units see of it what its package names.
+if(NOT TARGET zanoplatform_headers)
+    add_library(zanoplatform_headers INTERFACE)
+    target_link_libraries(zanoplatform_headers INTERFACE vorelix_base vorelix::zanoplatform)
+endif()
+
 add_library(vorelix SHARED
     $<TARGET_OBJECTS:vorelix_misc>
     $<TARGET_OBJECTS:vorelix_library>

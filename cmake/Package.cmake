@@ -32,6 +32,7 @@ function(vorelix_package name description requires)
     # far up it is depends on the library folder, which may be lib/<architecture>.
     file(RELATIVE_PATH pc_to_prefix
         /prefix/${CMAKE_INSTALL_LIBDIR}/pkgconfig /prefix)
+    string(REGEX REPLACE "/$" "" pc_to_prefix ${pc_to_prefix})
     file(CONFIGURE OUTPUT ${PROJECT_BINARY_DIR}/${name}.pc @ONLY CONTENT
 "prefix=\${pcfiledir}/@pc_to_prefix@
 libdir=\${prefix}/@CMAKE_INSTALL_LIBDIR@
