@@ -19,21 +19,21 @@
 
 /* One row of the media database: a song, or a playlist (id, path, title and album only). */
 typedef struct __tag_ZANO_MEDIA_INFO {
-    int id;              /* row id in the table it came from; 0: not in the database */
-    char path[4096];         /* absolute path of the file; any bytes but NUL */
-    int track;           /* 0: unknown */
-    int disc;            /* 0: unknown */
-    int year;            /* 0: unknown */
-    char title[255];         /* also receives a column selected "as title" */
-    char album[255];         /* of a playlist: the folder word */
+    int id;          /* row id in the table it came from; 0: not in the database */
+    char path[4096]; /* absolute path of the file; any bytes but NUL */
+    int track;       /* 0: unknown */
+    int disc;        /* 0: unknown */
+    int year;        /* 0: unknown */
+    char title[255]; /* also receives a column selected "as title" */
+    char album[255]; /* of a playlist: the folder word */
     char artist[255];
     char reservedText[255];
     char genre[255];
     char reservedColumns[849];
-    float duration;          /* seconds */
-    int bitrate;         /* bits per second */
+    float duration; /* seconds */
+    int bitrate;    /* bits per second */
     int reservedWord;
-    int frequency;       /* hertz */
+    int frequency; /* hertz */
     char reservedTail[1084];
 } ZANO_MEDIA_INFO;
 
@@ -51,7 +51,7 @@ typedef struct ZANO_PLAYLIST_REC {
 /* A node of a list of playlists. One calloc'd block each; a whole list is released with
  * ZANOPlayListFree. */
 typedef struct ZANO_PLAYLIST {
-    int id;                     /* row id (shared), or position from 1 (personal) */
+    int id; /* row id (shared), or position from 1 (personal) */
     char title[255];
     char path[4096];            /* absolute path of the playlist file */
     char album[255];            /* the table's album column (shared), or the base name */
