@@ -150,7 +150,7 @@ struct Parser {
     Paging paging;
 
     explicit Parser(const std::vector<Command> &commands) {
-        app.set_version_flag("--version", VORELIX_VERSION);
+        app.set_version_flag("--version", "vorelix " VORELIX_VERSION);
         app.add_flag("--json", request.json, "One JSON document instead of a table");
         app.add_flag("--verbose", request.verbose, "The library's log on standard error");
         app.require_subcommand(0, 1);  // an unknown command is named when none is required

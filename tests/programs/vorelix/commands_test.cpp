@@ -309,7 +309,7 @@ TEST_F(CommandLine, BadUsageIsExplained) {
     EXPECT_EQ(run({{"list", "--page", "010", "--page-size", "1"}}).status, 1);  // ten, no database
     EXPECT_EQ(run({{"--help"}}).status, 0);
     EXPECT_EQ(run({{"list", "--help"}}).status, 0);
-    EXPECT_EQ(run({{"--version"}}).out, VORELIX_VERSION "\n");
+    EXPECT_EQ(run({{"--version"}}).out, "vorelix " VORELIX_VERSION "\n");
 }
 
 TEST_F(CommandLine, FitsTheTerminal) {
