@@ -13,6 +13,10 @@ set(CMAKE_VISIBILITY_INLINES_HIDDEN ON)
 add_library(vorelix_rules INTERFACE)
 target_compile_options(vorelix_rules INTERFACE
     -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Wformat=2 -Werror)
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # GCC 12 with optimisation sees overlaps in std::string's operator+ that are not there.
+    target_compile_options(vorelix_rules INTERFACE -Wno-restrict)
+endif()
 target_compile_definitions(vorelix_rules INTERFACE
     ZANO_ROOT="${ZANO_ROOT}" _FILE_OFFSET_BITS=64)
 if(VORELIX_SANITIZE)

@@ -200,10 +200,13 @@ class SqliteCatalogue : public Catalogue {
         if (!isOrdered_) {
             buildOrders(progress);
         }
+
         if (std::abs(songs_ - state("counted")) > songs_ / kRecountShare) {
             countGrams();
         }
+
         setAnchors();
+
         commit();
         connection_.run("PRAGMA wal_checkpoint(PASSIVE)");
     }
@@ -411,7 +414,7 @@ class SqliteCatalogue : public Catalogue {
 
     void buildOrders(const Progress &progress) {
         const auto indexes = createIndexes();
-        const int total = 4 + static_cast<int>(indexes.size());
+        const int total = 3 + static_cast<int>(indexes.size());
         int done = 0;
         const auto step = [&] {
             ++done;
@@ -420,9 +423,7 @@ class SqliteCatalogue : public Catalogue {
             }
         };
         dropOrders();
-        Ranking(connection_, tailOrder()).rankAll();
-        step();
-        Ranking(connection_, titleOrder()).rankAll();
+        rankAll(connection_);
         step();
         for (const std::string &statement : indexes) {
             connection_.run(statement);
@@ -490,21 +491,15 @@ class SqliteCatalogue : public Catalogue {
         connection_.run("DELETE FROM anchors");
         Statement insert = prepare("INSERT INTO anchors VALUES(?1, ?2, ?3)");
         for (const StoredOrder &order : storedOrders()) {
-            std::string place(order.key);
-            place.append(place.empty() ? "" : ", ").append(order.tail);
             const std::string by =
-                (order.index.empty() ? "" : " INDEXED BY " + std::string(order.index));
-            Statement next = prepare("SELECT id FROM songs" + by + " WHERE (" + place + ")" +
-                                     (order.descending ? "<=" : ">=") + "(SELECT " + place +
-                                     " FROM songs WHERE id=?1) ORDER BY " + orderText(order, "") +
-                                     " LIMIT 1 OFFSET " + std::to_string(kAnchorDistance));
-            std::int64_t song = connection_.integer("SELECT id FROM songs" + by + " ORDER BY " +
-                                                    orderText(order, "") + " LIMIT 1");
-            for (std::int64_t at = 0; song != 0; ++at) {
-                insert.bind(1, order.number).bind(2, at).bind(3, song).run();
-                Using row(next);
-                row->bind(1, song);
-                song = row->step() ? row->integer(0) : 0;
+                order.index.empty() ? "" : " INDEXED BY " + std::string(order.index);
+            Statement songs =
+                prepare("SELECT id FROM songs" + by + " ORDER BY " + orderText(order, ""));
+            for (std::int64_t at = 0; songs.step(); ++at) {
+                if (at % kAnchorDistance == 0) {
+                    insert.bind(1, order.number).bind(2, at / kAnchorDistance);
+                    insert.bind(3, songs.integer(0)).run();
+                }
             }
         }
         setState("anchored", state("generation") + 1);

@@ -171,9 +171,9 @@ std::string matchOf(const TermTokens &term) {
 
 }  // namespace
 
-void addGramTokenizer(Connection &connection) {
+void addGramTokenizer(sqlite3 *connection) {
     fts5_api *api = nullptr;
-    Statement statement = connection.prepare("SELECT fts5(?1)");
+    Statement statement(connection, "SELECT fts5(?1)", false);
     statement.bindPointer(1, &api, "fts5_api_ptr");
     statement.step();
     fts5_tokenizer tokenizer{createTokenizer, deleteTokenizer, tokenize};

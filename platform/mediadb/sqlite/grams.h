@@ -23,7 +23,7 @@ namespace zano::mediadb::sqlite {
 constexpr std::string_view kGramTokenizer = "zanograms";
 
 /* Makes the tokenizer known to a connection, which needs it to read or write the index. */
-void addGramTokenizer(Connection &connection);
+void addGramTokenizer(sqlite3 *connection);
 
 /* The document of a song. */
 std::string gramDocument(std::string_view titleKey, std::string_view artistKey,

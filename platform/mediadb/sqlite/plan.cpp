@@ -12,6 +12,9 @@ namespace {
  * it, an entry of a token's list. Only their ratios matter, and only for speed. */
 constexpr double kFetchCost = 8;
 constexpr double kPrefixEntryCost = 1.5;
+/* A word is common when one song in so many has it. */
+constexpr std::int64_t kCommonShare = 20;
+constexpr std::int64_t kLongestWalk = 4000;
 /* Songs outside of the music root that are counted before counting those inside instead. */
 constexpr std::int64_t kOutsideBound = 20000;
 
@@ -114,10 +117,40 @@ void SongPlan::addPage(Sql &sql, Page page) {
     }
 }
 
+/* The rank at which a walk for a common word should give way to the index; null for rare ones.
+ * Walking costs a row for each song but needs no start; the index must find where the lists of
+ * all tokens meet. */
+std::optional<std::int64_t> SongPlan::endOfWalk(Page page) {
+    if (page.limit == 0 || reader_.state().anchored != reader_.state().generation) {
+        return std::nullopt;
+    }
+    const std::int64_t matches = estimatedMatches();
+    if (matches * kCommonShare < reader_.state().songs) {
+        return std::nullopt;
+    }
+    const std::int64_t entries =
+        (page.offset + page.limit) * 2 * reader_.state().songs / std::max<std::int64_t>(1, matches);
+    Sql find =
+        newSql("SELECT rank FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
+    find.bind(std::int64_t{findStoredOrder({Column::Title, false})->number}).add(" AND place=");
+    find.bind(1 + std::min(entries, kLongestWalk) / kAnchorDistance).add(")");
+    const std::int64_t rank = reader_.integer(find, INT64_MIN);
+    return rank == INT64_MIN ? std::nullopt : std::optional(rank);
+}
+
 Sql SongPlan::stream(std::string_view columns, Page page) {
-    Sql sql = newSql("SELECT ").add(columns);
+    const auto end = endOfWalk(page);
+    Sql sql = newSql(end ? "SELECT * FROM (" : "");
+    if (end) {
+        addWalk(sql, columns, *findStoredOrder({Column::Title, false}));
+        sql.add(" AND rank<").bind(*end).add(" ORDER BY rank) UNION ALL SELECT * FROM (");
+    }
+    sql.add("SELECT ").add(columns);
     addSource(sql, true);
-    sql.add(" ORDER BY grams.rowid");
+    if (end) {
+        sql.add(" AND grams.rowid>=").bind(*end);
+    }
+    sql.add(end ? " ORDER BY grams.rowid)" : " ORDER BY grams.rowid");
     addPage(sql, page);
     return sql;
 }
@@ -131,12 +164,17 @@ Sql SongPlan::candidates(std::string_view columns, const StoredOrder &order, Pag
     return sql;
 }
 
-Sql SongPlan::walk(std::string_view columns, const StoredOrder &order, Page page) {
-    Sql sql = newSql("SELECT ").add(columns).add(" FROM songs");
+void SongPlan::addWalk(Sql &sql, std::string_view columns, const StoredOrder &order) {
+    sql.add("SELECT ").add(columns).add(" FROM songs");
     if (!order.index.empty()) {
         sql.add(" INDEXED BY ").add(order.index);
     }
     addWhere(sql, false);
+}
+
+Sql SongPlan::walk(std::string_view columns, const StoredOrder &order, Page page) {
+    Sql sql = newSql("");
+    addWalk(sql, columns, order);
     sql.add(" ORDER BY ").add(orderText(order, "songs."));
     addPage(sql, page);
     return sql;

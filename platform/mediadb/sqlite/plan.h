@@ -1,7 +1,8 @@
 /* Turns a parsed query on the songs into the statement that answers it fastest.
  *
  * Ways to the rows, and when each is taken:
- *   stream      the search index gives matches in the default order, so a page stops early
+ *   stream      the search index gives matches in the default order, so a page stops early; for
+ *               common words the first stretch is walked, which often fills the page already
  *   candidates  few matches: fetch them all and sort; for every other order
  *   walk        many matches: follow the index of the order and keep what matches
  *   plain       everything else, and while the stored orders are not built: left to SQLite
@@ -49,9 +50,11 @@ class SongPlan {
 
     void addWhere(Sql &sql, bool withGrams);
     void addSource(Sql &sql, bool withGrams);
+    void addWalk(Sql &sql, std::string_view columns, const StoredOrder &order);
     void addMatch(Sql &sql);
     void addPage(Sql &sql, Page page);
     Sql stream(std::string_view columns, Page page);
+    std::optional<std::int64_t> endOfWalk(Page page);
     Sql candidates(std::string_view columns, const StoredOrder &order, Page page);
     Sql walk(std::string_view columns, const StoredOrder &order, Page page);
     std::optional<Sql> anchored(std::string_view columns, const StoredOrder &order, Page page);

@@ -33,15 +33,61 @@ std::string withColumn(std::string sql, std::string_view column) {
 }  // namespace
 
 const RankedOrder &tailOrder() {
-    static constexpr RankedOrder kOrder{
-        "tail_rank", 1024, isBeforeInTail,
-        "album_key, disc, track, title_key, artist_key, genre_key, year, path, duration"};
+    static constexpr RankedOrder kOrder{"tail_rank", 1024, isBeforeInTail};
     return kOrder;
 }
 
 const RankedOrder &titleOrder() {
-    static constexpr RankedOrder kOrder{"rank", 256, isBeforeByTitle, "title_key, tail_rank"};
+    static constexpr RankedOrder kOrder{"rank", 256, isBeforeByTitle};
     return kOrder;
+}
+
+/* The rows are written once and one after another: jumping between them, or writing them for each
+ * order, takes many times as long. */
+void rankAll(Connection &connection) {
+    struct Ranks {
+        std::int64_t id;
+        std::int64_t tail;
+        std::int64_t title;
+    };
+    std::vector<Ranks> songs;
+    Statement byTail = connection.prepare(
+        "SELECT id FROM songs ORDER BY album_key, disc, track, title_key, artist_key, genre_key, "
+        "year, path, duration");
+    while (byTail.step()) {
+        const auto place = static_cast<std::int64_t>(songs.size()) + 1;
+        songs.push_back({byTail.integer(0), place * tailOrder().distance, 0});
+    }
+    const auto isBefore = [](const Ranks &a, const Ranks &b) { return a.id < b.id; };
+    std::sort(songs.begin(), songs.end(), isBefore);
+
+    /* Songs of one title come together; their tails, found by id, decide between them. */
+    std::vector<Ranks *> sameTitle;
+    std::string title;
+    std::int64_t rank = 0;
+    const auto rankSameTitle = [&] {
+        std::sort(sameTitle.begin(), sameTitle.end(),
+                  [](const Ranks *a, const Ranks *b) { return a->tail < b->tail; });
+        for (Ranks *song : sameTitle) {
+            song->title = rank += titleOrder().distance;
+        }
+        sameTitle.clear();
+    };
+    Statement byTitle = connection.prepare("SELECT id, title_key FROM songs ORDER BY title_key");
+    while (byTitle.step()) {
+        if (byTitle.text(1) != title) {
+            rankSameTitle();
+            title = byTitle.text(1);
+        }
+        sameTitle.push_back(&*std::lower_bound(songs.begin(), songs.end(),
+                                               Ranks{byTitle.integer(0), 0, 0}, isBefore));
+    }
+    rankSameTitle();
+
+    Statement update = connection.prepare("UPDATE songs SET tail_rank=?1, rank=?2 WHERE id=?3");
+    for (const Ranks &song : songs) {
+        update.bind(1, song.tail).bind(2, song.title).bind(3, song.id).run();
+    }
 }
 
 std::string_view songKeyColumns() {
@@ -85,25 +131,10 @@ Ranking::Ranking(Connection &connection, const RankedOrder &order) : order_(orde
     before_ = prepare("SELECT id, @ FROM songs WHERE @<?1 ORDER BY @ DESC LIMIT ?2");
     behind_ = prepare("SELECT id, @ FROM songs WHERE @>=?1 ORDER BY @ LIMIT ?2");
     update_ = prepare("UPDATE songs SET @=?1 WHERE id=?2");
-    sorted_ = prepare("SELECT id FROM songs ORDER BY " + std::string(order.sortedBy));
 }
 
 void Ranking::setRank(std::int64_t id, std::int64_t rank) {
     update_.bind(1, rank).bind(2, id).run();
-}
-
-/* The sorting gives ids in the order of the ranks; the rows are then written one after another,
- * since jumping between them would take many times as long. */
-void Ranking::rankAll() {
-    std::vector<std::pair<std::int64_t, std::int64_t>> ranks;
-    while (sorted_.step()) {
-        const auto place = static_cast<std::int64_t>(ranks.size()) + 1;
-        ranks.emplace_back(sorted_.integer(0), place * order_.distance);
-    }
-    std::sort(ranks.begin(), ranks.end());
-    for (const auto &[id, rank] : ranks) {
-        setRank(id, rank);
-    }
 }
 
 /* The first ranked song that stands behind `song`, found by halving the range of the ranks. */

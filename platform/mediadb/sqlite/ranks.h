@@ -35,17 +35,16 @@ struct RankedOrder {
     std::string_view column;
     std::int64_t distance;  // between neighbours that are ranked at once
     bool (*isBefore)(const SongKey &, const SongKey &);
-    std::string_view sortedBy;  // the order as SQL, for all songs at once
 };
 const RankedOrder &tailOrder();
 const RankedOrder &titleOrder();
 
+/* Gives every song its rank in both orders. */
+void rankAll(Connection &connection);
+
 class Ranking {
   public:
     Ranking(Connection &connection, const RankedOrder &order);
-
-    /* Gives every song a rank. */
-    void rankAll();
 
     /* Ranks songs that have none, among those that have. Calls `moved` with the id and former
      * rank of each song that had to make room. */
@@ -71,7 +70,6 @@ class Ranking {
     Statement before_;
     Statement behind_;
     Statement update_;
-    Statement sorted_;
 };
 
 /* The columns of a SongKey, in the order in which readSongKey takes them. */

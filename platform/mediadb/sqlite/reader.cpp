@@ -58,7 +58,11 @@ void Reader::endSnapshot() noexcept {
     for (auto &[sql, statement] : statements_) {
         statement.reset();
     }
-    sqlite3_exec(connection_.get(), "ROLLBACK", nullptr, nullptr, nullptr);
+    try {
+        statement("ROLLBACK").run();
+    } catch (const std::exception &) {
+        /* SQLite has ended the transaction already, as it does after some failures. */
+    }
 }
 
 Statement &Reader::statement(const std::string &sql) {

@@ -133,7 +133,7 @@ void prepareForUse(Connection &connection) {
                                nullptr, nullptr, nullptr);
     sqlite3_create_function_v2(database, "zano_like", 2, kFlags, nullptr, likeFunction, nullptr,
                                nullptr, nullptr);
-    addGramTokenizer(connection);
+    addGramTokenizer(database);
 }
 
 void checkVersion(Connection &connection, const std::string &path) {

@@ -1,0 +1,66 @@
+#include "report.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <limits>
+
+namespace zano::bench {
+namespace {
+
+double medianOf(std::vector<double> values) {
+    const auto middle = values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2);
+    std::nth_element(values.begin(), middle, values.end());
+    return *middle;
+}
+
+}  // namespace
+
+bool RatioReporter::ReportContext(const Context &) {
+    return true;
+}
+
+void RatioReporter::ReportRuns(const std::vector<Run> &runs) {
+    for (const Run &run : runs) {
+        if (run.error_occurred) {
+            std::fprintf(stderr, "%s: %s\n", run.benchmark_name().c_str(),
+                         run.error_message.c_str());
+            continue;
+        }
+        if (run.run_type != Run::RT_Iteration) {
+            continue;
+        }
+        const std::string &name = run.run_name.function_name;
+        const size_t slash = name.rfind('/');
+        const std::string question = name.substr(0, slash);
+        const std::string way = name.substr(slash + 1);
+        if (times_.find(question) == times_.end()) {
+            questions_.push_back(question);
+        }
+        const double microseconds =
+            run.real_accumulated_time / static_cast<double>(run.iterations) * 1e6;
+        if (way == "library") {
+            times_[question].library.push_back(microseconds);
+        } else {
+            times_[question].raw[way].push_back(microseconds);
+        }
+    }
+}
+
+void RatioReporter::Finalize() {
+    std::printf("| question | library, µs | by hand, µs | ratio |\n|---|---:|---:|---:|\n");
+    for (const std::string &question : questions_) {
+        const Times &times = times_[question];
+        double best = std::numeric_limits<double>::infinity();
+        for (const auto &[way, values] : times.raw) {
+            best = std::min(best, medianOf(values));
+        }
+        if (times.library.empty() || times.raw.empty()) {
+            continue;
+        }
+        const double library = medianOf(times.library);
+        std::printf("| %s | %.1f | %.1f | %.2f |\n", question.c_str(), library, best,
+                    library / best);
+    }
+}
+
+}  // namespace zano::bench

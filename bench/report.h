@@ -1,0 +1,29 @@
+/* Prints the times of each question side by side, with their ratio, as a table in Markdown. */
+#pragma once
+
+#include <benchmark/benchmark.h>
+
+#include <map>
+#include <string>
+#include <vector>
+
+namespace zano::bench {
+
+/* Benchmarks are named "question/library" and "question/raw", "question/raw 2" and so on; with
+ * several raw ones the fastest counts. Medians over the repetitions are compared. */
+class RatioReporter : public benchmark::BenchmarkReporter {
+  public:
+    bool ReportContext(const Context &context) override;
+    void ReportRuns(const std::vector<Run> &runs) override;
+    void Finalize() override;
+
+  private:
+    struct Times {
+        std::vector<double> library;
+        std::map<std::string, std::vector<double>> raw;
+    };
+    std::vector<std::string> questions_;
+    std::map<std::string, Times> times_;
+};
+
+}  // namespace zano::bench
