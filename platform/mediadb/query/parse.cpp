@@ -39,7 +39,7 @@ bool isBlank(std::string_view text) {
     return text.find_first_not_of(" \t\r\n") == std::string_view::npos;
 }
 
-Value numberOf(const std::string &text) {
+Value numberOf(std::string_view text) {
     std::int64_t integer = 0;
     const char *end = text.data() + text.size();
     if (std::from_chars(text.data(), end, integer).ptr == end) {
@@ -48,7 +48,7 @@ Value numberOf(const std::string &text) {
     double real = 0;
     const auto [stop, error] = std::from_chars(text.data(), end, real);
     if (error != std::errc() || stop != end) {
-        throw QueryError("the query has a number out of range: " + text.substr(0, 40));
+        throw QueryError("the query has a number out of range: " + std::string(text.substr(0, 40)));
     }
     return real;
 }
@@ -170,7 +170,7 @@ class ConditionParser {
             tokens_.refuse("a pattern in quotes");
         }
         Expression pattern;
-        pattern.value = tokens_.take().text;
+        pattern.value = tokens_.takeText();
         expression.parts.push_back(std::move(pattern));
     }
 
@@ -186,9 +186,10 @@ class ConditionParser {
     Expression literal() {
         Expression expression;
         if (tokens_.peek().kind == Token::Kind::Number) {
-            expression.value = numberOf(tokens_.take().text);
+            expression.value = numberOf(tokens_.peek().text);
+            tokens_.skip();
         } else if (tokens_.peek().kind == Token::Kind::Text) {
-            expression.value = tokens_.take().text;
+            expression.value = tokens_.takeText();
         } else {
             tokens_.refuse("a number or a text");
         }
@@ -200,14 +201,15 @@ class ConditionParser {
         if (tokens_.peek().kind != Token::Kind::Name) {
             return literal();
         }
-        const std::string name = tokens_.take().text;
+        const std::string_view name = tokens_.peek().text;
+        tokens_.skip();
         if (tokens_.takeSign("(")) {
             return call(name);
         }
         const auto column = findColumn(table_, name);
         if (!column) {
-            throw QueryError("the query names no column of the table: \"" + name.substr(0, 40) +
-                             "\"");
+            throw QueryError("the query names no column of the table: \"" +
+                             std::string(name.substr(0, 40)) + "\"");
         }
         Expression expression;
         expression.kind = Expression::Kind::Column;
@@ -215,13 +217,13 @@ class ConditionParser {
         return expression;
     }
 
-    Expression call(const std::string &name) {
+    Expression call(std::string_view name) {
         const auto *function = std::find_if(
             kFunctions.begin(), kFunctions.end(),
-            [&name](std::string_view known) { return equalsIgnoringCase(known, name); });
+            [name](std::string_view known) { return equalsIgnoringCase(known, name); });
         if (function == kFunctions.end()) {
             throw QueryError("the query calls a function that is not allowed: \"" +
-                             name.substr(0, 40) + "\"");
+                             std::string(name.substr(0, 40)) + "\"");
         }
         Expression expression;
         expression.kind = Expression::Kind::Call;
@@ -238,9 +240,8 @@ class ConditionParser {
 
 Column takeColumn(Table table, Tokenizer &tokens) {
     if (tokens.peek().kind == Token::Kind::Name) {
-        const std::string name = tokens.peek().text;
-        if (const auto column = findColumn(table, name)) {
-            tokens.take();
+        if (const auto column = findColumn(table, tokens.peek().text)) {
+            tokens.skip();
             return *column;
         }
     }

@@ -9,26 +9,36 @@
 namespace zano::mediadb {
 namespace {
 
-constexpr std::string_view kBlanks = " \t\r\n";
-constexpr std::string_view kNameCharacters =
-    "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789_";
-constexpr std::string_view kDigits = "0123456789";
+constexpr bool isBlank(char c) {
+    return c == ' ' || c == '\t' || c == '\r' || c == '\n';
+}
+constexpr bool isDigit(char c) {
+    return c >= '0' && c <= '9';
+}
+constexpr bool isNamePart(char c) {
+    return (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || isDigit(c) || c == '_';
+}
 constexpr size_t kShownBytes = 40;
 
 /* Longer signs before their own beginnings. */
 constexpr std::array<std::string_view, 11> kSigns = {"<>", "!=", "<=", ">=", "<", ">",
                                                      "=",  "(",  ")",  ",",  "*"};
 
-std::string_view front(std::string_view text, std::string_view characters) {
-    return text.substr(0, std::min(text.find_first_not_of(characters), text.size()));
+/* The front of a text that consists of such characters. */
+std::string_view front(std::string_view text, bool (*isPart)(char)) {
+    size_t length = 0;
+    while (length < text.size() && isPart(text[length])) {
+        ++length;
+    }
+    return text.substr(0, length);
 }
 
 }  // namespace
 
-Token Tokenizer::take() {
-    Token taken = std::move(token_);
+std::string Tokenizer::takeText() {
+    std::string value = std::move(token_.value);
     next();
-    return taken;
+    return value;
 }
 
 bool Tokenizer::takeSign(std::string_view sign) {
@@ -64,28 +74,29 @@ void Tokenizer::refuse(std::string_view wanted) const {
     if (token_.kind == Token::Kind::End) {
         message += "its end";
     } else {
-        message += "\"" + token_.text.substr(0, kShownBytes) + "\"";
+        message.append("\"").append(token_.text.substr(0, kShownBytes)).append("\"");
     }
     message.append(" where ").append(wanted).append(" should stand");
     throw QueryError(message);
 }
 
 void Tokenizer::next() {
-    rest_.remove_prefix(front(rest_, kBlanks).size());
-    token_ = Token();
+    rest_.remove_prefix(front(rest_, isBlank).size());
+    token_.kind = Token::Kind::End;
+    token_.text = {};
     if (rest_.empty()) {
         return;
     }
     if (rest_.front() == '\'') {
         readText();
-    } else if (kDigits.find(rest_.front()) != std::string_view::npos) {
+    } else if (isDigit(rest_.front())) {
         readNumber();
-    } else if (kNameCharacters.find(rest_.front()) != std::string_view::npos) {
-        token_ = {Token::Kind::Name, std::string(front(rest_, kNameCharacters))};
+    } else if (isNamePart(rest_.front())) {
+        token_.kind = Token::Kind::Name;
+        token_.text = front(rest_, isNamePart);
         rest_.remove_prefix(token_.text.size());
     } else {
-        const bool isNegative = rest_.size() > 1 && rest_.front() == '-' &&
-                                kDigits.find(rest_[1]) != std::string_view::npos;
+        const bool isNegative = rest_.size() > 1 && rest_.front() == '-' && isDigit(rest_[1]);
         if (isNegative) {
             readNumber();
             return;
@@ -98,13 +109,15 @@ void Tokenizer::next() {
             throw QueryError("the query has a character that has no place there: \"" +
                              std::string(rest_.substr(0, kShownBytes)) + "\"");
         }
-        token_ = {Token::Kind::Sign, std::string(*sign)};
+        token_.kind = Token::Kind::Sign;
+        token_.text = rest_.substr(0, sign->size());
         rest_.remove_prefix(sign->size());
     }
 }
 
 void Tokenizer::readText() {
     std::string value;
+    const std::string_view whole = rest_;
     rest_.remove_prefix(1);
     for (;;) {
         const size_t quote = rest_.find('\'');
@@ -119,20 +132,24 @@ void Tokenizer::readText() {
         value.push_back('\'');
         rest_.remove_prefix(1);
     }
-    token_ = {Token::Kind::Text, std::move(value)};
+    token_.kind = Token::Kind::Text;
+    token_.text = whole.substr(0, whole.size() - rest_.size());
+    token_.value = std::move(value);
 }
 
 void Tokenizer::readNumber() {
     size_t length = rest_.front() == '-' ? 1 : 0;
-    length += front(rest_.substr(length), kDigits).size();
+    length += front(rest_.substr(length), isDigit).size();
     if (length < rest_.size() && rest_[length] == '.') {
-        length += 1 + front(rest_.substr(length + 1), kDigits).size();
+        length += 1 + front(rest_.substr(length + 1), isDigit).size();
     }
-    token_ = {Token::Kind::Number, std::string(rest_.substr(0, length))};
+    token_.kind = Token::Kind::Number;
+    token_.text = rest_.substr(0, length);
     rest_.remove_prefix(length);
-    if (!front(rest_, kNameCharacters).empty()) {
-        throw QueryError("the query has a number that ends in letters: \"" + token_.text +
-                         std::string(front(rest_, kNameCharacters).substr(0, kShownBytes)) + "\"");
+    if (!front(rest_, isNamePart).empty()) {
+        throw QueryError("the query has a number that ends in letters: \"" +
+                         std::string(token_.text) +
+                         std::string(front(rest_, isNamePart).substr(0, kShownBytes)) + "\"");
     }
 }
 

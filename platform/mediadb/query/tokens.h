@@ -16,7 +16,8 @@ class QueryError : public std::runtime_error {
 struct Token {
     enum class Kind { End, Name, Number, Text, Sign };
     Kind kind = Kind::End;
-    std::string text;  // of a Text: its value, with '' read as one quote
+    std::string_view text;  // a view of the query
+    std::string value;      // of a Text, with '' read as one quote
 };
 
 class Tokenizer {
@@ -25,7 +26,10 @@ class Tokenizer {
     explicit Tokenizer(std::string_view text) : rest_(text) { next(); }
 
     const Token &peek() const { return token_; }
-    Token take();
+    /* Goes on to the next token. */
+    void skip() { next(); }
+    /* The value of a Text, which is then behind. */
+    std::string takeText();
 
     bool takeSign(std::string_view sign);
     /* Keywords in any mix of case. */

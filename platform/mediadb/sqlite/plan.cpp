@@ -15,6 +15,8 @@ constexpr double kPrefixEntryCost = 1.5;
 /* A word is common when one song in so many has it. */
 constexpr std::int64_t kCommonShare = 20;
 constexpr std::int64_t kLongestWalk = 4000;
+/* Counts of so many tokens of a word tell enough. */
+constexpr size_t kTokensLookedUp = 3;
 /* Songs outside of the music root that are counted before counting those inside instead. */
 constexpr std::int64_t kOutsideBound = 20000;
 
@@ -42,28 +44,18 @@ void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_vie
 
 SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
     : reader_(reader), conjuncts_(conjunctsOf(condition)) {
+    /* A prefix that all paths have costs a comparison for each row, and counts would have to
+     * look at rows at all. */
     conjuncts_.erase(std::remove_if(conjuncts_.begin(), conjuncts_.end(),
                                     [this](const Conjunct &conjunct) {
                                         return !conjunct.pathPrefix.empty() &&
-                                               coversAllPaths(conjunct.pathPrefix);
+                                               reader_.allPathsBegin(conjunct.pathPrefix);
                                     }),
                      conjuncts_.end());
     answered_.resize(conjuncts_.size());
     if (reader_.state().isOrdered) {
         findGrams();
     }
-}
-
-/* Nearly always true of the music root. Two looks into the index of paths are cheaper than a
- * comparison for each row, and let counts be answered without looking at rows at all. */
-bool SongPlan::coversAllPaths(const std::string &prefix) {
-    for (const std::string_view end : {"min", "max"}) {
-        Using row(reader_.statement("SELECT " + std::string(end) + "(path) FROM songs"));
-        if (!row->step() || row->isNull(0) || row->text(0).substr(0, prefix.size()) != prefix) {
-            return false;
-        }
-    }
-    return true;
 }
 
 void SongPlan::findGrams() {
@@ -121,7 +113,8 @@ void SongPlan::addPage(Sql &sql, Page page) {
  * Walking costs a row for each song but needs no start; the index must find where the lists of
  * all tokens meet. */
 std::optional<std::int64_t> SongPlan::endOfWalk(Page page) {
-    if (page.limit == 0 || reader_.state().anchored != reader_.state().generation) {
+    const bool isOneList = grams_->isExact && terms_.size() == 1;
+    if (page.limit == 0 || isOneList || reader_.state().anchored != reader_.state().generation) {
         return std::nullopt;
     }
     const std::int64_t matches = estimatedMatches();
@@ -268,10 +261,12 @@ std::int64_t SongPlan::estimatedMatches() {
     std::int64_t sum = 0;
     for (const SearchTerm &term : terms_) {
         std::int64_t least = reader_.state().songs;
-        for (const std::string &token : gramsOf(term)) {
+        const auto tokens = gramsOf(term);
+        const size_t stride = 1 + tokens.size() / kTokensLookedUp;
+        for (size_t i = 0; i < tokens.size(); i += stride) {
             least = std::min(least, reader_.integer(newSql("SELECT songs FROM gram_counts "
                                                            "WHERE gram=")
-                                                        .bind(token)));
+                                                        .bind(tokens[i])));
         }
         sum += least;
     }

@@ -41,7 +41,6 @@ class SongPlan {
         std::int64_t limit;
     };
 
-    bool coversAllPaths(const std::string &prefix);
     void findGrams();
     std::int64_t estimatedMatches();
     std::int64_t candidatesUpTo(std::int64_t bound);

@@ -2,6 +2,8 @@
 
 #include <sys/stat.h>
 #include <unistd.h>
+
+#include <algorithm>
 #include <utility>
 
 #include "../engine.h"
@@ -30,9 +32,20 @@ void Reader::restartClock() {
     deadline_ = std::chrono::steady_clock::now() + std::chrono::milliseconds(kQueryLimitMs);
 }
 
+/* What was read of the state holds as long as nobody has written since. */
 void Reader::beginSnapshot() {
     restartClock();
     statement("BEGIN").run();
+    Using version(statement("PRAGMA data_version"));
+    version->step();
+    if (version->integer(0) != dataVersion_) {
+        readState();
+        commonPrefix_.reset();
+        dataVersion_ = version->integer(0);
+    }
+}
+
+void Reader::readState() {
     Using rows(statement("SELECT name, value FROM state"));
     while (rows->step()) {
         const std::string_view name = rows->text(0);
@@ -52,6 +65,22 @@ void Reader::beginSnapshot() {
             state_.facetCounts.emplace(name, value);
         }
     }
+}
+
+/* Nearly always true of the music root. What all paths begin with is what the first and the last
+ * of them have in common. */
+bool Reader::allPathsBegin(const std::string &prefix) {
+    if (!commonPrefix_) {
+        Using first(statement("SELECT min(path) FROM songs"));
+        Using last(statement("SELECT max(path) FROM songs"));
+        first->step();
+        last->step();
+        const std::string_view a = first->text(0);
+        const std::string_view b = last->text(0);
+        const auto end = std::mismatch(a.begin(), a.end(), b.begin(), b.end()).first;
+        commonPrefix_ = a.substr(0, static_cast<size_t>(end - a.begin()));
+    }
+    return commonPrefix_->compare(0, prefix.size(), prefix) == 0;
 }
 
 void Reader::endSnapshot() noexcept {

@@ -12,6 +12,7 @@
 #include <map>
 #include <memory>
 #include <mutex>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -37,6 +38,8 @@ class Reader {
     void beginSnapshot();
     void endSnapshot() noexcept;
     const State &state() const { return state_; }
+    /* Whether the path of every song begins so. */
+    bool allPathsBegin(const std::string &prefix);
 
     /* Gives what follows the time limit of a query. */
     void restartClock();
@@ -54,7 +57,11 @@ class Reader {
 
     Connection connection_;
     std::chrono::steady_clock::time_point deadline_;
+    void readState();
+
+    std::int64_t dataVersion_ = -1;
     State state_;
+    std::optional<std::string> commonPrefix_;                  // of the paths at dataVersion_
     std::list<std::pair<std::string, Statement>> statements_;  // the last used first
     std::map<std::string_view, std::list<std::pair<std::string, Statement>>::iterator> bySql_;
 };
