@@ -9,7 +9,9 @@
  * songs that "stand under the music root" are those below the folder that the link
  * /var/services/music points to; its text is put into conditions as it is. What comes from the
  * caller as condition, columns or order reaches the database as it is too: there it is refused
- * when it is anything but what media_database.h describes, and the open fails.
+ * when it is anything but what media_database.h describes, and the open fails. Rows are read
+ * until the database gives no more: a query that it stops in the middle, at its time limit,
+ * makes a shorter list and no failure.
  *
  * The functions keep no state; two threads may call them for different lists. C11 and C++.
  */
@@ -43,7 +45,7 @@ VORELIX_API int GenerateOrderString(const char *primary, char *out, int size);
  *   offset, limit  the page; both 0: all songs
  * 0: the list holds the songs in their order. It is empty when no song matches, and also, without
  * a line in the log, when the database cannot be opened or refuses the query; KLIBCErrGet()
- * (zanoplatform/error.h) tells which. -1: list is null, the music link cannot be read (also when
+ * (zanoplatform/error.h) tells which of these it was, or that the query was stopped. -1: list is null, the music link cannot be read (also when
  * there is no keyword), the keyword cannot be escaped, or memory ran out.
  *
  * A search covers the songs under the music root; without one, and in category 0, the listing

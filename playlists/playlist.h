@@ -32,8 +32,9 @@ VORELIX_API ZANO_PLAYLIST *ZANOPlayListFree(ZANO_PLAYLIST *list);
  * -1, with a line in the system log and *list null: a null list, null or empty ids, no database,
  * out of memory, or ids that the database does not take as "id in (ids)". They are put there as
  * they are, without escaping: a text that is not a number spoils the whole query, and nothing
- * else. Of ids that the database takes, an item with anything but blanks before its digits, or
- * with anything behind them ("3 ,7"), is left out. */
+ * else. Of ids that the database takes, one with anything behind its digits ("3 ,7") is left
+ * out. When the string list cannot be made (zanoplatform/strings.h), the list is empty and the
+ * result 0: intended and kept. */
 VORELIX_API int ZANOMusicListGetByID(ZANO_PLAYLIST_REC **list, const char *ids);
 
 VORELIX_C_API_END

@@ -38,11 +38,11 @@ TEST_F(Count, TextsThatReachTheDatabase) {
         {1, -1, "x", 0, '"' + inRoot + " and  ilike '%x%'\""},
         {1, 6, "x", 0, '"' + inRoot + " and  ilike '%x%'\""},
     };
-    script().rowCount = 42;
     for (const auto &each : cases) {
+        script().rowCount = each.songs == 0 ? 0 : 42;
         int count = -5;
         EXPECT_EQ(ZANOPageTotalRowCount(each.songs, each.category, each.keyword, &count), 0);
-        EXPECT_EQ(count, 42);
+        EXPECT_EQ(count, script().rowCount);
         EXPECT_EQ(takeTrace(), "open(" + std::to_string(each.table) + ", \"*\", " + each.condition +
                                    ", null, null, 0, 0, 0)\nclose\n");
     }

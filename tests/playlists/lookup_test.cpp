@@ -50,6 +50,16 @@ TEST_F(Lookup, AnEmptyItemIsIdZero) {
     EXPECT_EQ(list.text(), "1 one, 0 zero");
 }
 
+TEST_F(Lookup, OfTwoRowsWithOneIdTheLastComesFirst) {
+    script().rows = {row(5, "first"), row(5, "last")};
+    List one;
+    EXPECT_EQ(ZANOMusicListGetByID(one.address(), "5"), 0);
+    EXPECT_EQ(one.text(), "5 last");
+    List both;
+    EXPECT_EQ(ZANOMusicListGetByID(both.address(), "5,5,5"), 0);
+    EXPECT_EQ(both.text(), "5 last, 5 first");
+}
+
 TEST_F(Lookup, CopiesTheWholeRow) {
     ZANO_MEDIA_INFO full;
     std::fill_n(reinterpret_cast<unsigned char *>(&full), sizeof full, 0xA5);
