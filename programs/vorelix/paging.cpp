@@ -28,9 +28,8 @@ std::string nextCommand(const Request &request, int nextOffset) {
     const std::string option = request.byPage ? "--page" : "--offset";
     const int number = request.byPage ? nextOffset / request.span.limit + 1 : nextOffset;
     std::vector<std::string> words = without(option, request.words);
-    // right behind the command, where no "--" stands before it
-    const auto command = std::find(words.begin(), words.end(), request.command->name);
-    words.insert(command + 1, {option, std::to_string(number)});
+    const auto optionsEnd = std::find(words.begin(), words.end(), "--");
+    words.insert(optionsEnd, {option, std::to_string(number)});
     std::string line;
     for (const std::string &word : words) {
         line.append(line.empty() ? "" : " ").append(shellQuoted(word));

@@ -70,7 +70,7 @@ TEST_F(CommandLine, TablesForPeople) {
          "AC/DC\n"
          "AC\\DC\n"
          "\n"
-         "artists 1-2 of 4 (page 1 of 2; next: vorelix browse --page 2 artist --page-size 2)\n"},
+         "artists 1-2 of 4 (page 1 of 2; next: vorelix browse artist --page-size 2 --page 2)\n"},
         {{"browse", "genre", "--desc"}, "Genre\nPop\nÉlectro\n(unknown)\n\ngenres 1-3 of 3\n"},
         {{"browse", "album", "--search", "sasha"},
          "Album\nI Am… Sasha Fierce\n\nalbums 1-1 of 1\n"},
@@ -212,9 +212,9 @@ TEST_F(CommandLine, PagesAtTheEnds) {
         {{"list", "--page", "4"}, "no songs here: there are 101 in all, on pages 1 to 3"},
         {{"list", "--page-size", "101"}, "songs 1-101 of 101"},
         {{"search", "10", "--page-size", "100"},
-         "songs 1-100 of 101 (page 1 of 2; next: vorelix search --page 2 10 --page-size 100)"},
+         "songs 1-100 of 101 (page 1 of 2; next: vorelix search 10 --page-size 100 --page 2)"},
         {{"list", "--offset", "100"}, "songs 101-101 of 101"},
-        {{"list", "--limit", "1"}, "songs 1-1 of 101 (next: vorelix list --offset 1 --limit 1)"},
+        {{"list", "--limit", "1"}, "songs 1-1 of 101 (next: vorelix list --limit 1 --offset 1)"},
         {{"list", "--offset", "2147483647"}, "no songs here: there are 101 in all"},
         {{"random", "5"}, "5 of 101 songs, by chance"},
     };
