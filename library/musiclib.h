@@ -45,8 +45,9 @@ VORELIX_API int GenerateOrderString(const char *primary, char *out, int size);
  *   offset, limit  the page; both 0: all songs
  * 0: the list holds the songs in their order. It is empty when no song matches, and also, without
  * a line in the log, when the database cannot be opened or refuses the query; KLIBCErrGet()
- * (zanoplatform/error.h) tells which of these it was, or that the query was stopped. -1: list is null, the music link cannot be read (also when
- * there is no keyword), the keyword cannot be escaped, or memory ran out.
+ * (zanoplatform/error.h) tells which of these it was, or that the query was stopped. -1: list is
+ * null, the music link cannot be read (also when there is no keyword), the keyword cannot be
+ * escaped, or memory ran out.
  *
  * A search covers the songs under the music root; without one, and in category 0, the listing
  * covers the whole table. */
