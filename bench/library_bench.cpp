@@ -211,13 +211,9 @@ class Questions {
         const int byId = prepare("SELECT " + Raw::kColumns + " FROM songs WHERE id=?1");
         std::mt19937 random(1);
         std::uniform_int_distribution<long> anyId(1, songs_);
-        std::vector<long> hundred;
         std::vector<long> thousand;
         for (int i = 0; i < 1000; ++i) {
             thousand.push_back(anyId(random));
-            if (i < 100) {
-                hundred.push_back(anyId(random));
-            }
         }
         std::sort(thousand.begin(), thousand.end());
         thousand.erase(std::unique(thousand.begin(), thousand.end()), thousand.end());
@@ -230,7 +226,15 @@ class Questions {
         add(
             "random 100/library", [] { return listed(nullptr, "random", true, 0, 100); }, 100);
         add(
-            "random 100/raw (100 by id)", [=, this] { return raw_.rowsById(byId, hundred); }, 100);
+            "random 100/raw (100 by id)",
+            [this, byId, anyId, random]() mutable {
+                std::vector<long> hundred;
+                for (int i = 0; i < 100; ++i) {
+                    hundred.push_back(anyId(random));
+                }
+                return raw_.rowsById(byId, hundred);
+            },
+            100);
         add(
             "1000 by id/library",
             [list] {

@@ -33,7 +33,7 @@ const std::string Raw::kColumns =
 Raw::Raw(const std::string &path) {
     check(sqlite3_open_v2(path.c_str(), &database_, SQLITE_OPEN_READONLY, nullptr) == SQLITE_OK,
           database_);
-    sqlite3_exec(database_, "PRAGMA cache_size=-16384; PRAGMA mmap_size=268435456", nullptr,
+    sqlite3_exec(database_, "PRAGMA cache_size=-16384; PRAGMA mmap_size=4294967296", nullptr,
                  nullptr, nullptr);
     mediadb::sqlite::addGramTokenizer(database_);
 }

@@ -44,20 +44,25 @@ inline constexpr int kNodeSize = sizeof(ZANO_PLAYLIST_REC);
 
 /* Pushes every row that is left at the head of *list, so that the last row comes first. A node
  * is what allocateNode() returns: a malloc'd block of kNodeSize bytes or null. False when it
- * was null; the list then holds the rows read before. */
+ * was null although a row was left; the list then holds the rows read before.
+ *
+ * The database writes each row into its node: a copy of 7 KB for each would cost as much as
+ * reading it. */
 template <typename Allocate>
 bool fetchRows(MEDIA_DB_RESULT *result, RecordList &list, Allocate allocateNode) {
-    ZANO_MEDIA_INFO row{};
-    while (MediaInfoDBGet(result, &row) != -1) {
+    for (;;) {
         auto *node = static_cast<ZANO_PLAYLIST_REC *>(allocateNode());
+        ZANO_MEDIA_INFO rowWithoutNode;
+        if (MediaInfoDBGet(result, node != nullptr ? &node->info : &rowWithoutNode) == -1) {
+            std::free(node);
+            return true;
+        }
         if (node == nullptr) {
             return false;
         }
-        node->info = row;
         node->next = list.release();
         list.reset(node);
     }
-    return true;
 }
 
 }  // namespace vorelix

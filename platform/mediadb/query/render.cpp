@@ -123,12 +123,26 @@ void Sql::addCompare(const Expression &expression, std::string_view qualifier) {
     add(")");
 }
 
+/* Many numbers are one value, so that statements for lists of any length are one statement. */
 void Sql::addIn(const Expression &expression, std::string_view qualifier) {
     addCondition(expression.parts[0], qualifier);
+    const auto items = expression.parts.begin() + 1;
+    const bool areIntegers = std::all_of(items, expression.parts.end(), [](const Expression &item) {
+        return std::holds_alternative<std::int64_t>(item.value);
+    });
+    if (areIntegers && !dialect_->listOfIntegers.empty()) {
+        std::string list;
+        for (auto item = items; item != expression.parts.end(); ++item) {
+            list.append(list.empty() ? "[" : ",");
+            list.append(std::to_string(std::get<std::int64_t>(item->value)));
+        }
+        add(" IN (").add(dialect_->listOfIntegers).add("(").bind(list.append("]")).add("))");
+        return;
+    }
     std::string_view separator = " IN (";
-    for (auto part = expression.parts.begin() + 1; part != expression.parts.end(); ++part) {
+    for (auto item = items; item != expression.parts.end(); ++item) {
         add(separator);
-        addCondition(*part, qualifier);
+        addCondition(*item, qualifier);
         separator = ",";
     }
     add(")");

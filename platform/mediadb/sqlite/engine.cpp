@@ -229,7 +229,8 @@ class RandomCursor : public BaseCursor {
     RandomCursor(ReaderPool::Lease lease, Query asked)
         : BaseCursor(std::move(lease), std::move(asked)),
           plan_(reader(), query().condition),
-          byId_("SELECT " + columnList(query().select, "songs.") + " FROM songs WHERE songs.id=?1"),
+          byId_(reader().statement("SELECT " + columnList(query().select, "songs.") +
+                                   " FROM songs WHERE songs.id=?1")),
           random_(std::random_device{}()) {
         if (!query().distinct && plan_.isUnconditional() && query().limit > 0) {
             findRange();
@@ -243,10 +244,9 @@ class RandomCursor : public BaseCursor {
         reader().restartClock();
         while (left_ > 0) {
             const std::int64_t id = isDrawing_ ? draw() : ids_[static_cast<size_t>(left_ - 1)];
-            Using song(reader().statement(byId_));
-            song->bind(1, id);
-            if (song->step()) {
-                putRow(reader().statement(byId_), query().select, row);
+            const Using song(byId_);
+            if (byId_.bind(1, id).step()) {
+                putRow(byId_, query().select, row);
                 --left_;
                 return true;
             }
@@ -297,7 +297,7 @@ class RandomCursor : public BaseCursor {
     }
 
     SongPlan plan_;
-    std::string byId_;
+    Statement &byId_;
     std::mt19937_64 random_;
     bool isDrawing_ = false;
     std::int64_t first_ = 0;

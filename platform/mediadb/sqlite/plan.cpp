@@ -29,8 +29,13 @@ Sql newSql(std::string_view text) {
 }  // namespace
 
 const Dialect &dialect() {
-    static constexpr Dialect kDialect{'?',          "instr",  "zano_fold",
-                                      "zano_lower", "length", "zano_like"};
+    static constexpr Dialect kDialect{'?',
+                                      "instr",
+                                      "zano_fold",
+                                      "zano_lower",
+                                      "length",
+                                      "zano_like",
+                                      "SELECT value FROM json_each"};
     return kDialect;
 }
 
@@ -174,17 +179,10 @@ Sql SongPlan::walk(std::string_view columns, const StoredOrder &order, Page page
 }
 
 /* Deep pages of the whole library begin at the nearest anchor, if the anchors were set in the
- * very state of the catalogue that is being read. */
+ * very state of the catalogue that is being read. Where there is no anchor, there are no songs. */
 std::optional<Sql> SongPlan::anchored(std::string_view columns, const StoredOrder &order,
                                       Page page) {
     if (page.offset < kAnchorDistance || reader_.state().anchored != reader_.state().generation) {
-        return std::nullopt;
-    }
-    Sql find =
-        newSql("SELECT song FROM anchors WHERE stored_order=").bind(std::int64_t{order.number});
-    find.add(" AND place=").bind(page.offset / kAnchorDistance);
-    const std::int64_t song = reader_.integer(find, -1);
-    if (song < 0) {
         return std::nullopt;
     }
     Sql sql = newSql("SELECT ").add(columns).add(" FROM songs");
@@ -197,8 +195,9 @@ std::optional<Sql> SongPlan::anchored(std::string_view columns, const StoredOrde
     }
     place.append(order.tail);
     sql.add(" WHERE (").add(place).add(order.descending ? ")<=(SELECT " : ")>=(SELECT ");
-    sql.add(place).add(" FROM songs WHERE id=").bind(song).add(") ORDER BY ");
-    sql.add(orderText(order, "songs."));
+    sql.add(place).add(" FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
+    sql.bind(std::int64_t{order.number}).add(" AND place=");
+    sql.bind(page.offset / kAnchorDistance).add(")) ORDER BY ").add(orderText(order, "songs."));
     addPage(sql, {page.offset % kAnchorDistance, page.limit});
     return sql;
 }

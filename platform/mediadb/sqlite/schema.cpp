@@ -13,6 +13,8 @@ namespace zano::mediadb::sqlite {
 namespace {
 
 constexpr int kBusyTimeoutMs = 10000;
+/* Address space for reading without copies; a device of 32 bits has little of it. */
+constexpr std::int64_t kMappedBytes = sizeof(void *) >= 8 ? std::int64_t{4} << 30 : 64 << 20;
 
 /* One row for each version: what brings the version before it up to it. */
 constexpr std::array<const char *, kSchemaVersion> kMigrations = {R"sql(
@@ -220,7 +222,7 @@ Connection openForReading(const std::string &path) {
     }
     connection.run("PRAGMA query_only=ON");
     connection.run("PRAGMA cache_size=-16384");
-    connection.run("PRAGMA mmap_size=268435456");
+    connection.run("PRAGMA mmap_size=" + std::to_string(kMappedBytes));
     sqlite3_db_config(connection.get(), SQLITE_DBCONFIG_DEFENSIVE, 1, nullptr);
     sqlite3_db_config(connection.get(), SQLITE_DBCONFIG_ENABLE_LOAD_EXTENSION, 0, nullptr);
     sqlite3_limit(connection.get(), SQLITE_LIMIT_ATTACHED, 0);
