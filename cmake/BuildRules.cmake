@@ -15,7 +15,7 @@ target_compile_options(vorelix_rules INTERFACE
     -Wall -Wextra -Wpedantic -Wconversion -Wshadow -Wformat=2 -Werror)
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
     # GCC 12 with optimisation sees overlaps in std::string's operator+ that are not there.
-    target_compile_options(vorelix_rules INTERFACE -Wno-restrict)
+    target_compile_options(vorelix_rules INTERFACE $<$<NOT:$<CONFIG:Debug>>:-Wno-restrict>)
 endif()
 target_compile_definitions(vorelix_rules INTERFACE
     ZANO_ROOT="${ZANO_ROOT}" _FILE_OFFSET_BITS=64)

@@ -157,7 +157,8 @@ MEDIA_DB_RESULT *MediaInfoDBOpen(int table, const char *select, const char *cond
         held->cursor = held->engine->open(std::move(query));
         const bool isWhole = offset <= 0 && limit <= 0;
         const int rows = isWhole ? clampedToInt(held->cursor->countAll()) : 0;
-        result.reset(new MEDIA_DB_RESULT{table, offset, limit, rows, nullptr});
+        result = std::make_unique<MEDIA_DB_RESULT>();
+        *result = {table, offset, limit, rows, nullptr};
         result->cursor = held.release();
         return 0;
     });

@@ -135,10 +135,10 @@ int KLIBCSzListFind(PSZLIST list, const char *text) {
     }
     char **const begin = list->items;
     char **const end = begin + list->count;
-    char **found = end;
+    char **found = nullptr;
     if (list->sorted != 0) {
         found = std::lower_bound(begin, end, text, [list](const char *item, const char *wanted) {
-            return std::strcmp(item, wanted) * list->sorted < 0;
+            return list->sorted > 0 ? std::strcmp(item, wanted) < 0 : std::strcmp(item, wanted) > 0;
         });
     } else {
         found = std::find_if(begin, end,
@@ -151,8 +151,9 @@ void KLIBCSzListSortItems(PSZLIST list, int ascending) {
     if (list == nullptr) {
         return;
     }
-    const int sign = ascending != 0 ? 1 : -1;
-    std::sort(list->items, list->items + list->count,
-              [sign](const char *a, const char *b) { return std::strcmp(a, b) * sign < 0; });
-    list->sorted = sign;
+    const bool isAscending = ascending != 0;
+    std::sort(list->items, list->items + list->count, [isAscending](const char *a, const char *b) {
+        return isAscending ? std::strcmp(a, b) < 0 : std::strcmp(a, b) > 0;
+    });
+    list->sorted = isAscending ? 1 : -1;
 }

@@ -68,16 +68,16 @@ class ConditionParser {
 
   private:
     struct Deeper {
-        explicit Deeper(int &depth) : depth_(depth) {
-            if (++depth_ > kMaxDepth) {
-                --depth_;
+        explicit Deeper(int &depth) : level(depth) {
+            if (++level > kMaxDepth) {
+                --level;
                 throw QueryError("the query is nested too deeply");
             }
         }
-        ~Deeper() { --depth_; }
+        ~Deeper() { --level; }
         Deeper(const Deeper &) = delete;
         Deeper &operator=(const Deeper &) = delete;
-        int &depth_;
+        int &level;
     };
 
     Expression joined(Expression::Kind kind, std::string_view word,

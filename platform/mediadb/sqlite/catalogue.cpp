@@ -57,10 +57,19 @@ struct StoredSong {
     std::string document() const { return gramDocument(titleKey, artistKey, albumKey, genreKey); }
 };
 
+/* SQL that counts the rows that only one of two queries gives. */
+std::string differencesOf(const std::string &one, const std::string &other) {
+    std::string sql = "SELECT (SELECT count(*) FROM (";
+    sql.append(one).append(" EXCEPT ").append(other);
+    sql.append(")) + (SELECT count(*) FROM (");
+    sql.append(other).append(" EXCEPT ").append(one).append("))");
+    return sql;
+}
+
 class SqliteCatalogue : public Catalogue {
   public:
     explicit SqliteCatalogue(const std::string &path)
-        : connection_(openForWriting(path)), songsAtStart_(songCount()) {
+        : connection_(openForWriting(path)), songsAtStart_(SqliteCatalogue::songCount()) {
         find_ = prepare(
             "SELECT id, rank, title, album, artist, genre, title_key, album_key, artist_key, "
             "genre_key, track, disc, year, duration FROM songs WHERE path=?1");
@@ -530,11 +539,10 @@ class SqliteCatalogue : public Catalogue {
             const ColumnInfo &info = columnInfo(facet.column);
             const std::string number = std::to_string(facet.number);
             const std::string kept = "SELECT key, name, songs FROM facets WHERE facet=" + number;
-            const std::string real = "SELECT " + std::string(info.key) + ", " +
-                                     std::string(info.name) + ", count(*) FROM songs GROUP BY 1, 2";
-            const std::string differences = "SELECT (SELECT count(*) FROM (" + kept + " EXCEPT " +
-                                            real + ")) + (SELECT count(*) FROM (" + real +
-                                            " EXCEPT " + kept + "))";
+            std::string real = "SELECT ";
+            real.append(info.key).append(", ").append(info.name);
+            real.append(", count(*) FROM songs GROUP BY 1, 2");
+            const std::string differences = differencesOf(kept, real);
             if (connection_.integer(differences) != 0 ||
                 connection_.integer("SELECT count(*) FROM facets WHERE facet=" + number) !=
                     state(facet.state)) {
@@ -562,9 +570,7 @@ class SqliteCatalogue : public Catalogue {
             add.bind(1, rows.integer(0)).bind(2, std::string_view(document)).run();
         }
         const std::int64_t differences = connection_.integer(
-            "SELECT (SELECT count(*) FROM (SELECT term, doc FROM temp.kept EXCEPT "
-            "SELECT term, doc FROM temp.real)) + (SELECT count(*) FROM (SELECT term, doc FROM "
-            "temp.real EXCEPT SELECT term, doc FROM temp.kept))");
+            differencesOf("SELECT term, doc FROM temp.kept", "SELECT term, doc FROM temp.real"));
         connection_.run("DROP TABLE temp.kept");
         connection_.run("DROP TABLE temp.real");
         connection_.run("DROP TABLE temp.other_grams");
