@@ -30,10 +30,19 @@ bool append(SZLIST &list, std::string_view text) {
     return true;
 }
 
+bool isBefore(const char *a, const char *b) {
+    return std::strcmp(a, b) < 0;
+}
+
+void sortIfKept(SZLIST &list) {
+    if (list.sorted != 0) {
+        std::sort(list.items, list.items + list.count, isBefore);
+    }
+}
+
 void clear(SZLIST &list) {
     std::for_each(list.items, list.items + list.count, [](char *item) { std::free(item); });
     list.count = 0;
-    list.sorted = 0;
 }
 
 }  // namespace
@@ -122,6 +131,7 @@ int KLIBCStrSep(const char *text, const char *separator, PSZLIST *list) {
         }
         rest.remove_prefix(end + width);
     }
+    sortIfKept(**list);
     return (*list)->count;
 }
 
@@ -137,9 +147,7 @@ int KLIBCSzListFind(PSZLIST list, const char *text) {
     char **const end = begin + list->count;
     char **found = nullptr;
     if (list->sorted != 0) {
-        found = std::lower_bound(begin, end, text, [list](const char *item, const char *wanted) {
-            return list->sorted > 0 ? std::strcmp(item, wanted) < 0 : std::strcmp(item, wanted) > 0;
-        });
+        found = std::lower_bound(begin, end, text, isBefore);
     } else {
         found = std::find_if(begin, end,
                              [text](const char *item) { return std::strcmp(item, text) == 0; });
@@ -147,13 +155,10 @@ int KLIBCSzListFind(PSZLIST list, const char *text) {
     return found != end && std::strcmp(*found, text) == 0 ? static_cast<int>(found - begin) : -1;
 }
 
-void KLIBCSzListSortItems(PSZLIST list, int ascending) {
+void KLIBCSzListSortItems(PSZLIST list, int keepSorted) {
     if (list == nullptr) {
         return;
     }
-    const bool isAscending = ascending != 0;
-    std::sort(list->items, list->items + list->count, [isAscending](const char *a, const char *b) {
-        return isAscending ? std::strcmp(a, b) < 0 : std::strcmp(a, b) > 0;
-    });
-    list->sorted = isAscending ? 1 : -1;
+    list->sorted = keepSorted != 0 ? 1 : 0;
+    sortIfKept(*list);
 }

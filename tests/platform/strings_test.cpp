@@ -57,9 +57,13 @@ TEST(Lists, FindBeforeAndAfterSorting) {
     EXPECT_EQ(KLIBCSzListFind(list, "10"), 0);
     EXPECT_EQ(KLIBCSzListFind(list, "9"), 3);
     EXPECT_EQ(KLIBCSzListFind(list, "1"), -1);
+    KLIBCStrSep("4,0,30", ",", &list);
+    EXPECT_EQ(joined(list), "0|30|4|") << "kept sorted when it is filled anew";
+    EXPECT_EQ(KLIBCSzListFind(list, "30"), 1);
     KLIBCSzListSortItems(list, 0);
-    EXPECT_EQ(joined(list), "9|2|10|10|");
-    EXPECT_EQ(KLIBCSzListFind(list, "2"), 1);
+    KLIBCStrSep("4,0,30", ",", &list);
+    EXPECT_EQ(joined(list), "4|0|30|");
+    EXPECT_EQ(KLIBCSzListFind(list, "30"), 2);
     EXPECT_EQ(KLIBCSzListFind(list, "99"), -1);
 }
 

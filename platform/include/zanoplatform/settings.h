@@ -6,8 +6,8 @@
 #error "C++ only"
 #endif
 
-#include <string>
 #include <zanoplatform/export.h>
+#include <string>
 
 /* A view of the settings file, read once when the object is made. Blank lines and lines that
  * begin with # are skipped, spaces around key and value and one pair of quotes around the value

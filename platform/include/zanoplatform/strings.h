@@ -41,8 +41,9 @@ ZANOPLATFORM_API const char *KLIBCSzListGet(PSZLIST list, int index);
 /* The index of the first item equal to text, or -1. A sorted list is searched by halving. */
 ZANOPLATFORM_API int KLIBCSzListFind(PSZLIST list, const char *text);
 
-/* Sorts the items by their bytes: ascending when `ascending` is not 0, else descending. */
-ZANOPLATFORM_API void KLIBCSzListSortItems(PSZLIST list, int ascending);
+/* Not 0: sorts the items by their bytes, and keeps the list sorted when it is filled anew. 0: new
+ * items keep their order again. */
+ZANOPLATFORM_API void KLIBCSzListSortItems(PSZLIST list, int keepSorted);
 
 ZANOPLATFORM_C_API_END
 
