@@ -7,8 +7,6 @@
 #include <filesystem>
 #include <utility>
 
-#include "tag_phase.h"
-
 namespace zano::index {
 namespace {
 
@@ -133,7 +131,7 @@ void Indexer::carryOut(const Plan &plan) {
         remove(vanished);
     }
     if (!plan.toRead.isEmpty()) {
-        TagPhase(session_, plan.toRead, options_.readers, options_.limits).run();
+        TagPhase(session_, plan.toRead, options_.reading).run();
     }
     finish();
 }

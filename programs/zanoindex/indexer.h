@@ -1,23 +1,21 @@
 /* Brings the catalogue up to date with the disk. */
 #pragma once
 
-#include <cstddef>
 #include <string>
 #include <vector>
 
 #include "folder_walker.h"
 #include "path_list.h"
 #include "planner.h"
-#include "reader_process.h"
 #include "session.h"
+#include "tag_phase.h"
 
 namespace zano::index {
 
 struct IndexOptions {
     bool prune = false;      // believe that what is gone is gone
     bool rereadAll = false;  // read every file, changed or not
-    std::size_t readers = 1;
-    ReaderLimits limits;
+    TagPhase::Options reading;
     FolderWalker::OnFolder onFolder;  // see FolderWalker
 };
 

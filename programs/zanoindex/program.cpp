@@ -29,8 +29,20 @@ void printError(const std::string &text) {
     std::fprintf(stderr, "zanoindex: %s\n", text.c_str());
 }
 
-std::unique_ptr<mediadb::Catalogue> open(const std::string &location) {
-    return location.empty() ? mediadb::openCatalogue() : mediadb::openCatalogue(location);
+std::string locationOf(const ProgramOptions &options) {
+    return options.database.empty() ? mediadb::configuredLocation() : options.database;
+}
+
+/* Runs action, which uses the media database, and turns its failures into words and exit code. */
+template <typename Action>
+int useDatabase(const std::string &location, Action action) {
+    try {
+        return action(location);
+    } catch (const mediadb::DatabaseError &error) {
+        printError("the media database " + location + " could not be used: " + error.what() +
+                   "\nWhat was written before stays. See to the cause and run again.");
+        return kFailure;
+    }
 }
 
 /* Removes the rows of one path, byte for byte. */
@@ -55,7 +67,7 @@ bool removeFile(mediadb::Catalogue &catalogue, const std::string &path) {
 /* Nothing is printed when isSilent: what the library's callers print is an answer to somebody,
  * in which a line of this program would be out of place. */
 int removeFiles(const std::vector<std::string> &paths, const std::string &location, bool isSilent) {
-    const auto catalogue = open(location);
+    const auto catalogue = mediadb::openCatalogue(location);
     for (const auto &path : paths) {
         const bool wasThere = removeFile(*catalogue, path);
         if (!isSilent) {
@@ -69,12 +81,12 @@ int removeFiles(const std::vector<std::string> &paths, const std::string &locati
 /* A run with folders or notices. */
 class IndexRun {
   public:
-    IndexRun(const ProgramOptions &options, const ReaderLimits &limits)
+    IndexRun(const ProgramOptions &options, const std::string &location, const ProgramSetup &setup)
         : options_(options),
-          catalogue_(open(options.database)),
+          catalogue_(mediadb::openCatalogue(location)),
           progress_(options.quiet ? ProgressStyle::kNone : styleForStandardError()),
           session_{*catalogue_, progress_, stop_, {}},
-          indexer_(session_, indexOptions(limits)) {}
+          indexer_(session_, indexOptions(setup)) {}
 
     int run() {
         if (options_.notices) {
@@ -98,13 +110,14 @@ class IndexRun {
     }
 
   private:
-    IndexOptions indexOptions(const ReaderLimits &limits) {
+    IndexOptions indexOptions(const ProgramSetup &setup) {
         IndexOptions options;
         options.prune = options_.prune;
         options.rereadAll = options_.rereadAll;
-        options.readers =
-            options_.readers > 0 ? options_.readers : std::thread::hardware_concurrency();
-        options.limits = limits;
+        const std::size_t processors = std::thread::hardware_concurrency();
+        options.reading.readers = options_.readers > 0 ? options_.readers : processors;
+        options.reading.limits = setup.limits;
+        options.reading.batchSongs = setup.batchSongs;
         if (options_.watch) {
             watch_ = std::make_unique<FolderWatch>(
                 [this](const std::string &path, const std::string &reason) {
@@ -151,7 +164,9 @@ int run(int argc, char **argv, const ProgramSetup &setup) {
     const std::vector<std::string> arguments(argv, argv + argc);
     // The library starts this program with "-d" where its name would stand.
     if (arguments.size() == 2 && arguments[0] == "-d") {
-        return removeFiles({arguments[1]}, {}, true);
+        return useDatabase(mediadb::configuredLocation(), [&](const std::string &location) {
+            return removeFiles({arguments[1]}, location, true);
+        });
     }
     if (arguments.size() == 2 && arguments[1] == kReaderArgument) {
         return serveTags(setup.reader, setup.limits);
@@ -161,10 +176,11 @@ int run(int argc, char **argv, const ProgramSetup &setup) {
     if (!options) {
         return exitCode;
     }
-    if (!options->deletions.empty()) {
-        return removeFiles(options->deletions, options->database, options->quiet);
-    }
-    return IndexRun(*options, setup.limits).run();
+    return useDatabase(locationOf(*options), [&](const std::string &location) {
+        return options->deletions.empty()
+                   ? IndexRun(*options, location, setup).run()
+                   : removeFiles(options->deletions, location, options->quiet);
+    });
 }
 
 }  // namespace
@@ -172,9 +188,6 @@ int run(int argc, char **argv, const ProgramSetup &setup) {
 int runProgram(int argc, char **argv, const ProgramSetup &setup) noexcept {
     try {
         return run(argc, argv, setup);
-    } catch (const mediadb::DatabaseError &error) {
-        printError(std::string("the media database could not be used: ") + error.what() +
-                   "\nWhat was written before stays. See to the cause and run again.");
     } catch (const std::exception &error) {
         printError(error.what());
     } catch (...) {

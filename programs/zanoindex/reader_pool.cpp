@@ -172,7 +172,7 @@ void ReaderPool::watchTime(Reader &reader, std::chrono::nanoseconds passed) {
     }
     // A reader that did not use its time was waiting for the disk.
     const auto used = reader.process->processorTime() - *reader.processorTimeBefore;
-    const auto status = used > reader.waited / 4 ? ReadStatus::kOutOfTime : ReadStatus::kNoAnswer;
+    const auto status = used > reader.waited / 10 ? ReadStatus::kOutOfTime : ReadStatus::kNoAnswer;
     replace(reader, ReadAnswer{status, {}, {}});
 }
 

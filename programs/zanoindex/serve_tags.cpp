@@ -22,9 +22,9 @@
 #ifdef ZANOINDEX_ADDRESS_SANITIZER
 /* The sanitizer reserves terabytes of addresses, so no limit of the system can be set under it;
  * it has limits of its own. */
-extern "C" const char *__asan_default_options();
+extern "C" __attribute__((visibility("default"))) const char *__asan_default_options();
 extern "C" const char *__asan_default_options() {
-    return "max_allocation_size_mb=512:hard_rss_limit_mb=1024";
+    return "max_allocation_size_mb=512:hard_rss_limit_mb=600";
 }
 #endif
 
@@ -38,11 +38,10 @@ void limit(int resource, rlim_t value) {
     }
 }
 
-/* Dies with the indexer, leaves no core file, writes no file, and keeps to its memory. */
+/* Dies with the indexer, leaves no core file, and keeps to its memory. */
 void limitProcess([[maybe_unused]] const ReaderLimits &limits) {
     prctl(PR_SET_PDEATHSIG, SIGKILL);
     limit(RLIMIT_CORE, 0);
-    limit(RLIMIT_FSIZE, 0);
 #ifndef ZANOINDEX_ADDRESS_SANITIZER
     limit(RLIMIT_AS, limits.memoryBytes);
 #endif

@@ -9,7 +9,6 @@
 namespace zano::index {
 namespace {
 
-constexpr std::size_t kBatchSongs = 5000;
 constexpr std::size_t kBatchBytes = std::size_t{16} << 20U;
 constexpr std::chrono::seconds kBatchAge(2);
 /* While a batch is written, readers get new work after this many songs. */
@@ -48,12 +47,12 @@ std::size_t readersFor(std::size_t files, std::size_t most) {
 
 }  // namespace
 
-TagPhase::TagPhase(Session &session, const PathList &files, std::size_t readers,
-                   const ReaderLimits &limits)
+TagPhase::TagPhase(Session &session, const PathList &files, const Options &options)
     : session_(session),
       files_(files),
       total_(static_cast<std::int64_t>(files.size())),
-      pool_(*this, readersFor(files.size(), readers), limits) {}
+      batchSongs_(options.batchSongs),
+      pool_(*this, readersFor(files.size(), options.readers), options.limits) {}
 
 void TagPhase::run() {
     while (!session_.stop.isMade() && pool_.pump(kWait)) {
@@ -92,7 +91,7 @@ void TagPhase::addPending(PendingSong &&pending) {
 }
 
 bool TagPhase::isBatchDue() const {
-    return !pending_.empty() && (pending_.size() >= kBatchSongs || pendingBytes_ >= kBatchBytes ||
+    return !pending_.empty() && (pending_.size() >= batchSongs_ || pendingBytes_ >= kBatchBytes ||
                                  Clock::now() - firstPending_ >= kBatchAge);
 }
 

@@ -17,9 +17,14 @@ namespace zano::index {
 
 class TagPhase : private ReadJobs {
   public:
-    /* readers: how many processes at most. The list must stay while this does. */
-    TagPhase(Session &session, const PathList &files, std::size_t readers,
-             const ReaderLimits &limits);
+    struct Options {
+        std::size_t readers = 1;  // processes at most
+        ReaderLimits limits;
+        std::size_t batchSongs = 5000;  // in one transaction at most
+    };
+
+    /* The list must stay while this does. */
+    TagPhase(Session &session, const PathList &files, const Options &options);
 
     /* Until all is read and written, or a stop request is made; what was read is written then
      * too. */
@@ -42,6 +47,7 @@ class TagPhase : private ReadJobs {
     PathList::Reader files_;
     std::int64_t total_;
     std::int64_t done_ = 0;
+    std::size_t batchSongs_;
     ReaderPool pool_;
     std::vector<PendingSong> pending_;
     std::size_t pendingBytes_ = 0;

@@ -1,0 +1,316 @@
+#include <sys/stat.h>
+#include <algorithm>
+
+#include "index_test.h"
+#include "mediadb/sqlite/engine.h"
+
+namespace zano::index {
+namespace {
+
+using Lines = std::vector<std::string>;
+
+class ScanTest : public IndexTest {
+  protected:
+    /* The bytes of all files of the database. */
+    std::string databaseContent() const {
+        std::string content;
+        for (const char *suffix : {"", "-wal"}) {
+            content += contentOf(databaseFile().string() + suffix);
+        }
+        return content;
+    }
+
+    void addMany(const std::string &name, int count) const {
+        for (int i = 0; i < count; ++i) {
+            add(name + "/" + std::to_string(i) + ".ogg", "ogg");
+        }
+    }
+};
+
+TEST_F(ScanTest, SecondRunTouchesNothing) {
+    addMany("a", 5);
+    add("b/.hidden.mp3");
+    write(music() + "/b/notes.txt", "no music");
+    EXPECT_EQ(counts(summaryOf({music()})),
+              "added 5, updated 0, unchanged 0, removed 0, kept 0, failed 0");
+    const auto before = databaseContent();
+    EXPECT_EQ(counts(summaryOf({music()})),
+              "added 0, updated 0, unchanged 5, removed 0, kept 0, failed 0");
+    EXPECT_EQ(databaseContent(), before);
+}
+
+TEST_F(ScanTest, ChangedFilesAreReadAgain) {
+    addMany("a", 4);
+    run({music()});
+    const fs::path path = music() + "/a/1.ogg";
+    const auto time = fs::last_write_time(path);
+
+    write(path, contentOf(sample("flac")));  // another size
+    EXPECT_EQ(summaryOf({music()})["updated"], 1);
+    fs::last_write_time(path, time + std::chrono::nanoseconds(1));
+    EXPECT_EQ(summaryOf({music()})["updated"], 1);
+    // only the change time is another, as after a tag editor that keeps the other two
+    auto content = contentOf(path);
+    const auto at = content.find("Älbum");
+    ASSERT_NE(at, std::string::npos);
+    const auto kept = fs::last_write_time(path);
+    write(path, content.replace(at, 6, "Album2"));
+    fs::last_write_time(path, kept);
+    EXPECT_EQ(counts(summaryOf({music()})),
+              "added 0, updated 1, unchanged 3, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summaryOf({"--reread", music()})),
+              "added 0, updated 4, unchanged 0, removed 0, kept 0, failed 0");
+    EXPECT_EQ(paths().size(), 4U);
+}
+
+TEST_F(ScanTest, RowsOfVanishedFilesGo) {
+    addMany("a", 6);
+    add("b/x.mp3");
+    run({music()});
+    fs::remove(music() + "/a/0.ogg");
+    fs::rename(music() + "/b", music() + "/c");
+    EXPECT_EQ(counts(summaryOf({music()})),
+              "added 1, updated 0, unchanged 5, removed 2, kept 0, failed 0");
+    EXPECT_EQ(paths().back(), "c/x.mp3");
+    // other folders than the scanned one are left alone
+    fs::remove(music() + "/c/x.mp3");
+    EXPECT_EQ(counts(summaryOf({music() + "/a"})),
+              "added 0, updated 0, unchanged 5, removed 0, kept 0, failed 0");
+    EXPECT_EQ(paths().size(), 6U);
+}
+
+TEST_F(ScanTest, FolderThatLostItsSongsKeepsItsRows) {
+    struct Case {
+        const char *what;
+        std::function<void(const fs::path &)> lose;
+        const char *reason;
+    };
+    const Case cases[] = {
+        {"missing", [](const fs::path &folder) { fs::remove_all(folder); }, "it is missing"},
+        {"empty",
+         [](const fs::path &folder) {
+             fs::remove_all(folder);
+             fs::create_directory(folder);
+         },
+         "it holds no audio files any more"},
+        {"half",
+         [](const fs::path &folder) {
+             for (const char *name : {"0.ogg", "1.ogg", "2.ogg"}) {
+                 fs::remove(folder / name);
+             }
+         },
+         "more than half of its songs are gone (3 of 5 songs)"},
+    };
+    for (const auto &[what, lose, reason] : cases) {
+        SCOPED_TRACE(what);
+        const auto folder = music() + "/" + what;
+        addMany(what, 5);
+        addMany("other", 2);
+        run({music()});
+        lose(folder);
+        fs::remove(music() + "/other/0.ogg");
+
+        const auto ended = run({folder, music() + "/other"});
+        EXPECT_EQ(ended.status, 1);
+        EXPECT_NE(ended.err.find(folder + ": " + reason), std::string::npos) << ended.err;
+        EXPECT_NE(ended.err.find("--prune"), std::string::npos);
+        EXPECT_EQ(paths().size(), 6U) << "the other folder was cleaned up";
+
+        const auto summary = summaryOf({"--prune", folder});
+        EXPECT_EQ(summary["removed"].asUInt(), std::string(what) == "half" ? 3U : 5U);
+        fs::remove_all(music());
+        fs::create_directory(music());
+        summaryOf({"--prune", music()});
+        EXPECT_EQ(paths(), Lines());
+    }
+}
+
+TEST_F(ScanTest, HalfIsNotMoreThanHalf) {
+    addMany("a", 4);
+    run({music()});
+    fs::remove(music() + "/a/0.ogg");
+    fs::remove(music() + "/a/1.ogg");
+    EXPECT_EQ(summaryOf({music()})["removed"], 2);
+}
+
+TEST_F(ScanTest, FolderThatWasNeverThere) {
+    const auto ended = run({music() + "/nowhere"});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_NE(ended.err.find("/nowhere: No such file or directory"), std::string::npos);
+}
+
+TEST_F(ScanTest, SongsBelowUnreadableFoldersAreKept) {
+    addMany("open", 3);
+    addMany("shut/inner", 2);
+    addMany("listed", 2);
+    run({music()});
+    const auto shut = music() + "/shut";
+    const auto listed = music() + "/listed";
+    ASSERT_EQ(chmod(shut.c_str(), 0), 0);
+    ASSERT_EQ(chmod(listed.c_str(), 0400), 0);  // names can be read, files cannot be looked at
+    auto arguments = argumentsOf({"--json", "--prune", music()});
+    const auto ended = Process(ZANOINDEX_PROGRAM, arguments, Process::Errors::kFile, false).wait();
+    chmod(shut.c_str(), 0700);
+    chmod(listed.c_str(), 0700);
+    EXPECT_EQ(ended.status, 1) << ended.err;
+    EXPECT_EQ(counts(parsed(ended.out)),
+              "added 0, updated 0, unchanged 3, removed 0, kept 4, failed 0");
+    EXPECT_NE(ended.err.find(shut + ": cannot be looked at: Permission denied"), std::string::npos)
+        << ended.err;
+    EXPECT_EQ(paths().size(), 7U);
+}
+
+TEST_F(ScanTest, AnyNameIsIndexedAndOpensAgain) {
+    const Lines names = {
+        "!before/x.mp3", "a b/x.mp3",      "a/x.mp3",      "a-b.mp3",       "Bj\xF6rk.mp3",
+        "\xFF\xFE.mp3",  "two\nlines.mp3", "'quote\".mp3", "per%cent_.mp3", "back\\slash.mp3",
+        "-d.mp3",        "trailing .mp3",  "UPPER.MP3",
+    };
+    for (const auto &name : names) {
+        add(name);
+    }
+    run({music()});
+    auto expected = names;
+    std::sort(expected.begin(), expected.end());
+    auto listed = paths();
+    std::sort(listed.begin(), listed.end());
+    EXPECT_EQ(listed, expected);
+    for (const auto &name : listed) {
+        EXPECT_TRUE(fs::exists(music() + "/" + name)) << name;
+    }
+    EXPECT_EQ(counts(summaryOf({music()})),
+              "added 0, updated 0, unchanged 13, removed 0, kept 0, failed 0");
+}
+
+TEST_F(ScanTest, NamesInMessagesAndJson) {
+    const auto path = music() + "/\x1B[2J\xFF\n.mp3";
+    write(path, "not music");
+    const auto ended = run({"--json", music()});
+    EXPECT_NE(ended.err.find(music() + "/\\x1B[2J\\xFF\\n.mp3: not an audio file\n"),
+              std::string::npos)
+        << ended.err;
+    const auto failed = parsed(ended.out)["failed"][0];
+    EXPECT_TRUE(failed["pathBytes"].asString().ends_with("/%1B[2J%FF%0A.mp3"));
+}
+
+TEST_F(ScanTest, LinksAndSpecialFiles) {
+    add("real/x.mp3");
+    fs::create_symlink(music() + "/real/x.mp3", music() + "/link.mp3");
+    fs::create_symlink("nowhere.mp3", music() + "/dangling.mp3");
+    fs::create_symlink("self.mp3", music() + "/self.mp3");
+    fs::create_directory_symlink(music(), music() + "/real/loop");
+    fs::create_directory(music() + "/folder.mp3");
+    add("folder.mp3/y.mp3");
+    ASSERT_EQ(mkfifo((music() + "/pipe.mp3").c_str(), 0600), 0);
+    const auto ended = run({music()});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(paths(), (Lines{"folder.mp3/y.mp3", "link.mp3", "real/x.mp3"}));
+    EXPECT_NE(ended.err.find("1 links to folders were not followed, the first is " + music() +
+                             "/real/loop"),
+              std::string::npos)
+        << ended.err;
+}
+
+TEST_F(ScanTest, PathsThatAreTooLong) {
+    add("x.mp3");
+    // deeper than a path can say, made step by step
+    const std::string step(250, 'd');
+    const auto home = fs::current_path();
+    fs::current_path(music());
+    for (int depth = 0; depth < 20; ++depth) {
+        fs::create_directory(step);
+        fs::current_path(step);
+    }
+    fs::copy_file(sample("mp3"), "deep.mp3");
+    fs::current_path(home);
+    const auto summary = summaryOf({music()}, 1);
+    EXPECT_EQ(paths(), Lines{"x.mp3"});
+    EXPECT_NE(summary["folders"][0]["reason"].asString().find("File name too long"),
+              std::string::npos);
+}
+
+TEST_F(ScanTest, FoldersAreGivenInAnyForm) {
+    addMany("a/b", 2);
+    addMany("c", 1);
+    fs::create_directory_symlink(music(), folder_ / "link");
+    const auto link = (folder_ / "link").string();
+    EXPECT_EQ(summaryOf({link + "/a/../a//", music() + "/a/b", music(), music() + "/"})["added"],
+              3);
+    EXPECT_EQ(paths(), (Lines{"a/b/0.ogg", "a/b/1.ogg", "c/0.ogg"}));
+    EXPECT_EQ(summaryOf({music() + "/c/0.ogg"})["unchanged"], 1) << "a single file";
+}
+
+TEST_F(ScanTest, Notices) {
+    addMany("a", 2);
+    run({music()});
+    const auto song = music() + "/a/0.ogg";
+    const auto other = music() + "/a/1.ogg";
+    const auto moved = music() + "/moved.ogg";
+    const auto fresh = add("new.ogg", "ogg");
+    fs::rename(other, moved);
+    fs::remove(song);
+    const auto engine = mediadb::sqlite::makeEngine(databaseFile());
+    engine->addNotice({0, "/lists/a.m3u", "", 1});
+    engine->addNotice({0, fresh, "", 1});
+    engine->addNotice({0, song, "", 5});  // gone, but nobody said so
+    engine->addNotice({0, moved, other, 4});
+    const auto ended = run({"--notices"});
+    EXPECT_EQ(ended.status, 0) << ended.err;
+    EXPECT_EQ(ended.out.substr(0, ended.out.rfind("\n", ended.out.size() - 2) + 1),
+              "playlist /lists/a.m3u was added\nsong " + fresh + " was added\nsong " + song +
+                  " was changed\nsong " + moved + " was changed and moved from " + other + "\n");
+    EXPECT_EQ(paths(), (Lines{"a/0.ogg", "moved.ogg", "new.ogg"}));
+    engine->addNotice({0, song, "", 2});
+    EXPECT_EQ(summaryOf({"--notices"})["notices"].size(), 1U);
+    EXPECT_EQ(paths(), (Lines{"moved.ogg", "new.ogg"}));
+    EXPECT_EQ(summaryOf({"--notices"})["notices"].size(), 0U) << "each is worked off once";
+}
+
+TEST_F(ScanTest, Usage) {
+    const std::vector<Lines> wrong = {
+        {},
+        {"--unknown", "x"},
+        {"-j", "0", "x"},
+        {"-j", "many", "x"},
+        {"--watch"},
+        {""},
+        {"-d"},
+        {"-d", ""},
+        {"-d", "x", "y"},
+        {"-d", "x", "--notices"},
+        {"--database"},
+    };
+    for (const auto &arguments : wrong) {
+        const auto ended = run(arguments);
+        EXPECT_EQ(ended.status, 2) << testing::PrintToString(arguments);
+        EXPECT_EQ(ended.out, "");
+        EXPECT_NE(ended.err, "");
+    }
+    EXPECT_FALSE(fs::exists(databaseFile()));
+    EXPECT_NE(run({"--help"}).out.find("--prune"), std::string::npos);
+    EXPECT_TRUE(run({"--version"}).out.starts_with("zanoindex "));
+}
+
+TEST_F(ScanTest, DatabaseThatCannotBeUsed) {
+    add("x.mp3");
+    write(databaseFile(), "this is not a database, but it is somebody's file\n");
+    const auto before = contentOf(databaseFile());
+    const auto ended = run({music()});
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_NE(ended.err.find(databaseFile()), std::string::npos) << ended.err;
+    EXPECT_EQ(contentOf(databaseFile()), before);
+    const auto other =
+        Process(ZANOINDEX_PROGRAM, {"zanoindex", "--database", "x:y", music()}).wait();
+    EXPECT_EQ(other.status, 1);
+    EXPECT_NE(other.err, "");
+}
+
+TEST_F(ScanTest, Quiet) {
+    add("x.mp3");
+    const auto ended = run({"-q", music()});
+    EXPECT_EQ(ended.out + ended.err, "");
+    EXPECT_EQ(paths(), Lines{"x.mp3"});
+}
+
+}  // namespace
+}  // namespace zano::index

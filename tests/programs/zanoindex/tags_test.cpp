@@ -1,0 +1,195 @@
+#include <algorithm>
+#include <random>
+
+#include "index_test.h"
+#include "text.h"
+
+namespace zano::index {
+namespace {
+
+using TagsTest = IndexTest;
+
+/* Ten bytes, to be replaced by ten others in a file. */
+constexpr std::string_view kTitle =
+    "S\xC3\xB8"
+    "dm\xC3\xA9 \xE6\x9B\xB2";
+static_assert(kTitle.size() == 11);
+
+std::string replaced(std::string content, std::string_view from, std::string_view to) {
+    const auto at = content.find(from);
+    EXPECT_NE(at, std::string::npos) << from;
+    return at == std::string::npos ? content : content.replace(at, from.size(), to);
+}
+
+TEST_F(TagsTest, EveryFormat) {
+    struct Case {
+        std::string suffix;
+        std::string tags = "Sødmé 曲|Øyvind|Älbum|Various|Jazz|2004|3|1";
+        std::string sound = "44100 Hz";
+    };
+    const Case cases[] = {
+        {"aiff"},
+        {"flac"},
+        {"m4a"},
+        {"m4b"},
+        {"mp3"},
+        {"mp4"},
+        {"oga"},
+        {"ogg"},
+        {"opus", Case().tags, "48000 Hz"},
+        {"spx", Case().tags, "32000 Hz"},
+        {"tta", "sample|||||0|0|0"},
+        {"wav", "Sødmé 曲|Øyvind|Älbum||Jazz|2004|3|0"},
+        {"wma"},
+        {"wv"},
+    };
+    std::vector<std::string> expected;
+    for (const auto &[suffix, tags, sound] : cases) {
+        add("sample." + suffix, suffix);
+        expected.push_back("sample." + suffix + "|" + tags);
+    }
+    const auto summary = summaryOf({music()});
+    EXPECT_EQ(songs(), expected);
+    EXPECT_EQ(counts(summary), "added 14, updated 0, unchanged 0, removed 0, kept 0, failed 0");
+    const auto lines = sounds();
+    ASSERT_EQ(lines.size(), std::size(cases));
+    for (std::size_t i = 0; i < lines.size(); ++i) {
+        EXPECT_TRUE(lines[i].ends_with(cases[i].sound)) << lines[i];
+    }
+    EXPECT_EQ(lines[5], "sample.mp4 1.0 s 66000 bit/s 44100 Hz");
+}
+
+TEST_F(TagsTest, TextsThatAreNotUtf8) {
+    const std::string_view latin =
+        "S\xF8"
+        "dm\xE9 Lied";
+    ASSERT_EQ(latin.size(), kTitle.size() - 1);
+    const auto padded = std::string(latin) + "s";
+    std::vector<std::string> expected;
+    for (const char *suffix : {"flac", "m4a", "mp3", "oga", "ogg", "opus", "spx", "wav"}) {
+        const auto name = std::string("a.") + suffix;
+        write(music() + "/" + name, replaced(contentOf(sample(suffix)), kTitle, padded));
+        expected.push_back(name + "|Sødmé Lieds|Øyvind");
+    }
+    run({music()});
+    auto lines = songs();
+    for (auto &line : lines) {
+        line.resize(line.find("|Älbum"));
+    }
+    EXPECT_EQ(lines, expected);
+}
+
+/* A tag at the end, of fixed size and Latin-1, is all that this file has. */
+TEST_F(TagsTest, OldTagOfAnMp3) {
+    auto content = contentOf(sample("mp3"));
+    const auto frames = content.find("\xFF\xFB", content.find("Lavf"));
+    content = content.substr(frames);
+    std::string tag = "TAGBj\xF6rk's \x96 S\xF8ng";
+    tag.resize(33);
+    tag += "Artist  ";
+    tag.resize(128);
+    tag[127] = 17;  // Rock
+    write(music() + "/old.mp3", content + tag);
+    write(music() + "/untagged.mp3", content);
+    run({music()});
+    EXPECT_EQ(songs(), (std::vector<std::string>{"old.mp3|Björk's – Søng|Artist|||Rock|0|0|0",
+                                                 "untagged.mp3|untagged|||||0|0|0"}));
+}
+
+TEST_F(TagsTest, WrongSuffixes) {
+    const std::pair<const char *, const char *> cases[] = {
+        {"flac.mp3", "flac"}, {"mp3.flac", "mp3"},  {"mp4.ogg", "mp4"},
+        {"ogg.opus", "ogg"},  {"opus.ogg", "opus"}, {"wav.wma", "wav"}};
+    std::vector<std::string> titles;
+    for (const auto &[name, suffix] : cases) {
+        add(name, suffix);
+    }
+    run({music()});
+    for (const auto &line : songs()) {
+        EXPECT_NE(line.find("|Sødmé 曲|Øyvind|"), std::string::npos) << line;
+    }
+    EXPECT_EQ(paths().size(), std::size(cases));
+}
+
+TEST_F(TagsTest, WhatIsNotAudioIsNamedAndNotListed) {
+    write(music() + "/text.mp3", "This is no music.\n");
+    write(music() + "/empty.flac", "");
+    write(music() + "/zeros.wav", std::string(100'000, '\0'));
+    write(music() + "/page.ogg", "<html><body>Not found</body></html>");
+    add("good.mp3");
+    const auto ended = run({music()});
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_EQ(paths(), std::vector<std::string>{"good.mp3"});
+    for (const char *name : {"text.mp3", "empty.flac", "zeros.wav", "page.ogg"}) {
+        const auto line = "cannot read " + music() + "/" + name + ": not an audio file\n";
+        EXPECT_NE(ended.err.find(line), std::string::npos) << ended.err;
+    }
+    // once more: named again, and what was listed before stays when its file is damaged
+    write(music() + "/good.mp3", "no longer");
+    const auto summary = summaryOf({music()});
+    EXPECT_EQ(counts(summary), "added 0, updated 0, unchanged 0, removed 0, kept 0, failed 5");
+    EXPECT_EQ(paths(), std::vector<std::string>{"good.mp3"});
+}
+
+/* Two hundred copies of each format with ends cut off and bytes flipped, most of them in the
+ * first kilobytes, where the tags are. */
+TEST_F(TagsTest, DamagedFiles) {
+    constexpr int kCopies = 200;
+    std::mt19937 random(20040506);
+    std::size_t files = 0;
+    for (const char *suffix : {"aiff", "flac", "m4a", "m4b", "mp3", "mp4", "oga", "ogg", "opus",
+                               "spx", "tta", "wav", "wma", "wv"}) {
+        const auto whole = contentOf(sample(suffix));
+        for (int copy = 0; copy < kCopies; ++copy, ++files) {
+            auto content = whole;
+            if (copy % 2 == 0) {
+                content.resize(random() % content.size());
+            }
+            for (auto flips = random() % 24; flips > 0 && !content.empty(); --flips) {
+                const auto near =
+                    std::min<std::size_t>(content.size(), flips % 4 == 0 ? ~0U : 2048);
+                content[random() % near] = static_cast<char>(random());
+            }
+            write(music() + "/" + std::to_string(copy) + "." + suffix, content);
+        }
+    }
+    const auto ended = run({"--json", music()});
+    ASSERT_EQ(ended.status, 0) << ended.err;
+    const auto summary = parsed(ended.out);
+    EXPECT_EQ(summary["files"].asUInt(), files);
+    EXPECT_EQ(summary["added"].asUInt() + summary["failed"].size(), files);
+    EXPECT_GT(summary["failed"].size(), 0U);
+    for (const auto &failed : summary["failed"]) {
+        EXPECT_NE(ended.err.find("cannot read " + failed["path"].asString() + ": " +
+                                 failed["reason"].asString()),
+                  std::string::npos);
+    }
+    EXPECT_LT(ended.peakKilobytes, 700 * 1024);
+    for (const auto &line : songs()) {
+        EXPECT_TRUE(isUtf8(line)) << printable(line);
+    }
+    EXPECT_NO_THROW(mediadb::openCatalogue(location())->check());
+}
+
+TEST_F(TagsTest, DemoMusic) {
+    const fs::path untitled = fs::path(ZANOINDEX_DEMO) / "Loose Files/Untitled Recording.wav";
+    const auto before = fs::last_write_time(untitled);
+    const auto again = Process(ZANOINDEX_MAKE_DEMO, {"make-demo-music", ZANOINDEX_DEMO}).wait();
+    EXPECT_EQ(again.status, 0) << again.err;
+    EXPECT_EQ(fs::last_write_time(untitled), before) << "a second call does nothing";
+    const auto summary = summaryOf({ZANOINDEX_DEMO});
+    EXPECT_EQ(counts(summary), "added 36, updated 0, unchanged 0, removed 0, kept 0, failed 0");
+    const auto lines = songs();
+    for (const char *tags :
+         {"|<img src=x onerror=alert(1)>|", "|ПЕСНЯ|", "|ΣΊΣΥΦΟΣ|", "|ドライブ|", "|Tip‐Toe|AC‐DC|",
+          "|C:\\Music\\New Folder\\|R.E.M.|", "|100% Proof|Motörhead|", "|Hidden_Track|Björk|",
+          "|She Said \"Hello\" & It's Fine|Beyoncé|", "|Æbler og Øl|Ørsted|",
+          "|Untitled Recording|||||0|0|0"}) {
+        EXPECT_TRUE(std::any_of(lines.begin(), lines.end(), [&](const std::string &line) {
+            return line.find(tags) != std::string::npos;
+        })) << tags;
+    }
+}
+
+}  // namespace
+}  // namespace zano::index

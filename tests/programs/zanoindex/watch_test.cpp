@@ -1,0 +1,103 @@
+#include <csignal>
+
+#include "index_test.h"
+
+namespace zano::index {
+namespace {
+
+using Lines = std::vector<std::string>;
+
+class WatchTest : public IndexTest {
+  protected:
+    void start() {
+        process_ = std::make_unique<Process>(ZANOINDEX_PROGRAM,
+                                             argumentsOf({"--json", "--watch", music()}));
+        EXPECT_FALSE(parsed(process_->readLine())["stopped"].asBool());
+    }
+
+    /* Reads summaries until so many songs in all were added, updated and removed. */
+    void await(unsigned added, unsigned updated, unsigned removed) {
+        Json::Value sum;
+        const auto isReached = [&] {
+            return sum["added"].asUInt() >= added && sum["updated"].asUInt() >= updated &&
+                   sum["removed"].asUInt() >= removed;
+        };
+        while (!isReached() && !HasFailure()) {
+            const auto summary = parsed(process_->readLine());
+            for (const char *name : {"added", "updated", "removed"}) {
+                sum[name] = sum[name].asUInt() + summary[name].asUInt();
+            }
+        }
+    }
+
+    Ended stop(int signal) {
+        kill(process_->pid(), signal);
+        return process_->wait();
+    }
+
+    std::unique_ptr<Process> process_;
+};
+
+TEST_F(WatchTest, FollowsFilesAndFolders) {
+    add("a/1.mp3");
+    add("b/2.mp3");
+    start();
+
+    add("a/new.ogg", "ogg");
+    await(1, 0, 0);
+    EXPECT_EQ(paths(), (Lines{"a/1.mp3", "a/new.ogg", "b/2.mp3"}));
+
+    // a folder in a new folder, and a file that is put there once both are watched
+    add("c/d/3.mp3");
+    await(1, 0, 0);
+    add("c/d/4.mp3");
+    await(1, 0, 0);
+    EXPECT_EQ(paths().size(), 5U);
+
+    add("a/1.mp3", "flac");
+    await(0, 1, 0);
+
+    fs::rename(music() + "/c", music() + "/renamed");
+    await(2, 0, 2);
+    add("renamed/d/5.mp3");
+    await(1, 0, 0);
+
+    // an album moved in from elsewhere, and links
+    fs::create_directories(folder_ / "elsewhere/album");
+    fs::copy_file(sample("opus"), folder_ / "elsewhere/album/6.opus");
+    fs::rename(folder_ / "elsewhere/album", music() + "/album");
+    fs::create_hard_link(music() + "/b/2.mp3", music() + "/b/hard.mp3");
+    fs::create_symlink(music() + "/b/2.mp3", music() + "/b/soft.mp3");
+    await(3, 0, 0);
+
+    // moved out, and deleted
+    fs::rename(music() + "/album", folder_ / "elsewhere/album");
+    fs::remove_all(music() + "/renamed");
+    await(0, 0, 4);
+    EXPECT_EQ(paths(), (Lines{"a/1.mp3", "a/new.ogg", "b/2.mp3", "b/hard.mp3", "b/soft.mp3"}));
+    EXPECT_EQ(stop(SIGINT).status, 0);
+}
+
+TEST_F(WatchTest, NamesWhatItCannotRead) {
+    add("a.mp3");
+    start();
+    write(music() + "/b.mp3", "no music");
+    const auto summary = parsed(process_->readLine());
+    EXPECT_EQ(summary["failed"].size(), 1U);
+    const auto ended = stop(SIGTERM);
+    EXPECT_EQ(ended.status, 0);
+    EXPECT_NE(ended.err.find("/b.mp3: not an audio file"), std::string::npos) << ended.err;
+}
+
+TEST_F(WatchTest, EndsWhenNothingIsLeft) {
+    add("a.mp3");
+    start();
+    fs::rename(music(), folder_ / "moved");
+    const auto ended = process_->wait();
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_NE(ended.err.find("no folder is left to watch"), std::string::npos) << ended.err;
+    EXPECT_EQ(paths().size(), 1U) << "a folder that is gone keeps its songs";
+}
+
+}  // namespace
+}  // namespace zano::index
