@@ -6,6 +6,7 @@
 #include <taglib/mp4file.h>
 #include <taglib/oggfile.h>
 #include <taglib/tpropertymap.h>
+#include <algorithm>
 #include <array>
 #include <cstdint>
 #include <string_view>
@@ -169,6 +170,48 @@ void addFromId3v2(FileStream &stream, PropertyMap &properties) {
     addFromFrames(viewOf(frames), properties);
 }
 
+// APE
+
+/* Each item: the length of its value, flags, its name (in any case) and a zero, the value. */
+void addFromItems(std::string_view items, PropertyMap &properties) {
+    constexpr std::size_t kHeader = 8;
+    constexpr unsigned kBinary = 6;
+    while (items.size() > kHeader) {
+        const std::size_t size = littleEndian(items);
+        const bool isText = (littleEndian(items.substr(4)) & kBinary) == 0;
+        items.remove_prefix(kHeader);
+        const auto name = items.substr(0, items.find('\0'));
+        items.remove_prefix(std::min(items.size(), name.size() + 1));
+        if (size > items.size()) {
+            return;
+        }
+        if (isText) {
+            addUnlessUtf8(name, items.substr(0, size), properties);
+        }
+        items.remove_prefix(size);
+    }
+}
+
+/* The tag ends the file, or stands before an old tag of 128 bytes; its length, which counts the
+ * footer but not the header, is in its footer. */
+void addFromApe(FileStream &stream, PropertyMap &properties) {
+    constexpr unsigned long kFooter = 32;
+    constexpr long kOldTag = 128;
+    constexpr std::size_t kLengthAt = 12;
+    for (const long end : {stream.length(), stream.length() - kOldTag}) {
+        const long footerAt = end - static_cast<long>(kFooter);
+        const auto footer = footerAt < 0 ? ByteVector() : readAt(stream, footerAt, kFooter);
+        if (viewOf(footer).starts_with("APETAGEX")) {
+            const long size = littleEndian(viewOf(footer).substr(kLengthAt));
+            const auto items =
+                readAt(stream, std::max(0L, end - size),
+                       static_cast<unsigned long>(std::max(0L, size - static_cast<long>(kFooter))));
+            addFromItems(viewOf(items), properties);
+            return;
+        }
+    }
+}
+
 // MP4
 
 constexpr std::array kAtoms = {
@@ -207,6 +250,7 @@ bool addDroppedTexts(TagLib::File &file, FileStream &stream, PropertyMap &proper
         addFromMp4(*mp4, stream, properties);
     } else {
         addFromId3v2(stream, properties);
+        addFromApe(stream, properties);
     }
     return properties != before;
 }

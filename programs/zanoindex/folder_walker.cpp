@@ -137,7 +137,8 @@ void FolderWalker::readEntries(int descriptor) {
     Level &level = pushLevel();
     errno = 0;
     while (const auto *entry = readdir(folder.get())) {
-        if (!addEntry(level, descriptor, entry->d_name, entry->d_type)) {
+        if (!isHidden(entry->d_name) &&
+            !addEntry(level, descriptor, entry->d_name, entry->d_type)) {
             break;
         }
         errno = 0;
@@ -152,15 +153,12 @@ void FolderWalker::readEntries(int descriptor) {
 /* false, with errno set, when nothing can be learned of the entries of this folder. */
 bool FolderWalker::addEntry(Level &level, int descriptor, std::string_view name,
                             unsigned char type) {
-    if (isHidden(name)) {
-        return true;
-    }
+    const bool isAudio = formatOfName(name) != Format::kNone;
+    const bool canMatter = type == DT_LNK || type == DT_UNKNOWN || (type == DT_REG && isAudio);
     if (type == DT_DIR) {
         add(level, std::string(name) + '/', {});
-        return true;
     }
-    const bool canBeFile = type == DT_REG && formatOfName(name) != Format::kNone;
-    if (!canBeFile && type != DT_LNK && type != DT_UNKNOWN) {
+    if (!canMatter) {
         return true;
     }
     struct stat status = {};
@@ -170,12 +168,9 @@ bool FolderWalker::addEntry(Level &level, int descriptor, std::string_view name,
     }
     if (fstatat(descriptor, name.data(), &status, 0) == 0) {
         addTarget(level, name, status, isLink);
-        return true;
-    }
-    if (errno == EACCES && !isLink) {
+    } else if (errno == EACCES && !isLink) {
         return false;
-    }
-    if (!isAbsence(errno) && formatOfName(name) != Format::kNone) {
+    } else if (!isAbsence(errno) && isAudio) {
         fail(path_ + std::string(name), errno);
     }
     return true;

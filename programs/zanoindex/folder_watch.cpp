@@ -112,6 +112,7 @@ void FolderWatch::forget(const std::string &path) {
 }
 
 void FolderWatch::handle(const inotify_event &event, FolderChanges &changes) {
+    constexpr std::uint32_t kGone = IN_DELETE_SELF | IN_MOVE_SELF | IN_UNMOUNT | IN_IGNORED;
     if ((event.mask & IN_Q_OVERFLOW) != 0) {
         changes.isLossy = true;
         return;
@@ -120,25 +121,30 @@ void FolderWatch::handle(const inotify_event &event, FolderChanges &changes) {
     if (found == paths_.end()) {
         return;
     }
-    const auto folder = found->second;
-    if ((event.mask & (IN_DELETE_SELF | IN_MOVE_SELF | IN_UNMOUNT | IN_IGNORED)) != 0) {
-        // What it held is no news of its own: its parent tells of a deletion, and an unmounted
-        // disk has lost nothing. Another folder may have its path by now.
-        if (watches_[folder] == event.wd) {
-            forget(folder);
-        }
-        paths_.erase(event.wd);
-        return;
+    if ((event.mask & kGone) != 0) {
+        handleGone(event.wd, std::string(found->second));
+    } else if (event.len > 0 && event.name[0] != '.') {
+        handleEntry(event.mask, found->second + '/' + static_cast<const char *>(event.name),
+                    changes);
     }
-    if (event.len == 0 || event.name[0] == '.') {
-        return;
+}
+
+/* What a folder held that is gone is no news of its own: its parent tells of a deletion, and an
+ * unmounted disk has lost nothing. Another folder may have its path by now. */
+void FolderWatch::handleGone(int watch, const std::string &folder) {
+    if (watches_[folder] == watch) {
+        forget(folder);
     }
-    const auto path = folder + '/' + static_cast<const char *>(event.name);
-    const bool isFolder = (event.mask & IN_ISDIR) != 0;
-    if (isFolder && (event.mask & (IN_MOVED_FROM | IN_DELETE)) != 0) {
+    paths_.erase(watch);
+}
+
+void FolderWatch::handleEntry(std::uint32_t events, const std::string &path,
+                              FolderChanges &changes) {
+    const bool isFolder = (events & IN_ISDIR) != 0;
+    if (isFolder && (events & (IN_MOVED_FROM | IN_DELETE)) != 0) {
         forget(path);
     }
-    const bool isUnfinished = !isFolder && (event.mask & IN_CREATE) != 0;
+    const bool isUnfinished = !isFolder && (events & IN_CREATE) != 0;
     if (!isUnfinished || isWholeWhenCreated(path)) {
         changes.paths.insert(path);
     }

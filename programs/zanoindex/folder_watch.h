@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <functional>
 #include <map>
 #include <set>
@@ -45,6 +46,8 @@ class FolderWatch {
   private:
     void warnOnce(const std::string &path, const std::string &reason);
     void handle(const inotify_event &event, FolderChanges &changes);
+    void handleGone(int watch, const std::string &folder);
+    void handleEntry(std::uint32_t events, const std::string &path, FolderChanges &changes);
     void forget(const std::string &path);
 
     Descriptor inotify_;

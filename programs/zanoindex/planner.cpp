@@ -19,23 +19,86 @@ mediadb::FileStamp faultyStamp(mediadb::FileStamp stamp) {
     return stamp;
 }
 
+/* The walk of the disk, which follows the rows of the catalogue. */
+class Planner::Merge {
+  public:
+    Merge(Planner &planner, FolderWalker &walker, PathList &toRead)
+        : session_(planner.session_),
+          rereadAll_(planner.options_.rereadAll),
+          walker_(walker),
+          toRead_(toRead) {
+        advance();
+    }
+
+    void takeRow(std::string_view path, const mediadb::FileStamp &known) {
+        ++result_.known;
+        while (hasFile_ && file_.path < path) {
+            takeNewFile();
+        }
+        if (hasFile_ && file_.path == path) {
+            takeKnownFile(known);
+        } else if (walker_.isUncertain(path)) {
+            ++session_.summary.kept;
+        } else {
+            result_.vanished.add(path, known, true);
+        }
+    }
+
+    Comparison takeRest() {
+        while (hasFile_) {
+            takeNewFile();
+        }
+        result_.hasStart = walker_.hasStart();
+        return std::move(result_);
+    }
+
+  private:
+    void advance() {
+        hasFile_ = !session_.stop.isMade() && walker_.next(file_);
+        if (hasFile_) {
+            ++result_.found;
+            session_.progress.show(Phase::kLooking, ++session_.summary.files, 0);
+        }
+    }
+
+    void takeNewFile() {
+        toRead_.add(file_.path, file_.stamp, false);
+        advance();
+    }
+
+    void takeKnownFile(const mediadb::FileStamp &known) {
+        if (!rereadAll_ && known == file_.stamp) {
+            ++session_.summary.unchanged;
+        } else if (!rereadAll_ && known == faultyStamp(file_.stamp)) {
+            session_.fileFailed(std::string(file_.path), kStillFaulty);
+        } else {
+            toRead_.add(file_.path, file_.stamp, true);
+        }
+        advance();
+    }
+
+    Session &session_;
+    bool rereadAll_;
+    FolderWalker &walker_;
+    PathList &toRead_;
+    Comparison result_;
+    FoundFile file_;
+    bool hasFile_ = false;
+};
+
 Planner::Planner(Session &session, Options options)
     : session_(session), options_(std::move(options)) {}
 
-void Planner::noteFound(Comparison &comparison) {
-    ++comparison.found;
-    session_.progress.show(Phase::kLooking, ++session_.summary.files, 0);
-}
-
-void Planner::noteKnown(const FoundFile &file, const mediadb::FileStamp &known, PathList &toRead) {
-    const bool isTrusted = !options_.rereadAll;
-    if (isTrusted && known == file.stamp) {
-        ++session_.summary.unchanged;
-    } else if (isTrusted && known == faultyStamp(file.stamp)) {
-        session_.fileFailed(std::string(file.path), kStillFaulty);
-    } else {
-        toRead.add(file.path, file.stamp, true);
-    }
+Comparison Planner::compare(const std::string &start, PathList &toRead) {
+    FolderWalker walker(start, options_.onFolder);
+    Merge merge(*this, walker, toRead);
+    session_.catalogue.forEachFile(start,
+                                   [&](std::string_view path, const mediadb::FileStamp &known) {
+                                       merge.takeRow(path, known);
+                                   });
+    auto comparison = merge.takeRest();
+    reportProblems(walker);
+    return comparison;
 }
 
 void Planner::reportProblems(const FolderWalker &walker) {
@@ -50,43 +113,6 @@ void Planner::reportProblems(const FolderWalker &walker) {
                                   printable(walker.firstSkippedLink()) +
                                   "; name the folders they lead to as well to index them");
     }
-}
-
-Comparison Planner::compare(const std::string &start, PathList &toRead) {
-    Comparison comparison;
-    FolderWalker walker(start, options_.onFolder);
-    FoundFile file;
-    bool hasFile = false;
-    const auto advance = [&] {
-        hasFile = !session_.stop.isMade() && walker.next(file);
-        if (hasFile) {
-            noteFound(comparison);
-        }
-    };
-    const auto compareRow = [&](std::string_view path, const mediadb::FileStamp &known) {
-        ++comparison.known;
-        while (hasFile && file.path < path) {
-            toRead.add(file.path, file.stamp, false);
-            advance();
-        }
-        if (hasFile && file.path == path) {
-            noteKnown(file, known, toRead);
-            advance();
-        } else if (walker.isUncertain(path)) {
-            ++session_.summary.kept;
-        } else {
-            comparison.vanished.add(path, known, true);
-        }
-    };
-    advance();
-    session_.catalogue.forEachFile(start, compareRow);
-    while (hasFile) {
-        toRead.add(file.path, file.stamp, false);
-        advance();
-    }
-    comparison.hasStart = walker.hasStart();
-    reportProblems(walker);
-    return comparison;
 }
 
 }  // namespace zano::index

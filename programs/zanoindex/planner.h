@@ -40,8 +40,8 @@ class Planner {
     Comparison compare(const std::string &start, PathList &toRead);
 
   private:
-    void noteKnown(const FoundFile &file, const mediadb::FileStamp &known, PathList &toRead);
-    void noteFound(Comparison &comparison);
+    class Merge;
+
     void reportProblems(const FolderWalker &walker);
 
     Session &session_;

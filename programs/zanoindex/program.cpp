@@ -1,9 +1,11 @@
 #include "program.h"
 
+#include <cerrno>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
 #include <memory>
+#include <system_error>
 #include <thread>
 
 #include "folder_watch.h"
@@ -21,8 +23,9 @@ namespace {
 constexpr int kSignalBase = 128;
 
 void printLine(const std::string &line) {
-    std::printf("%s\n", line.c_str());
-    std::fflush(stdout);
+    if (std::printf("%s\n", line.c_str()) < 0 || std::fflush(stdout) != 0) {
+        throw std::system_error(errno, std::generic_category(), "writing to standard output");
+    }
 }
 
 void printError(const std::string &text) {

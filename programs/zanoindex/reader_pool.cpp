@@ -176,18 +176,23 @@ void ReaderPool::watchTime(Reader &reader, std::chrono::nanoseconds passed) {
     replace(reader, ReadAnswer{status, {}, {}});
 }
 
-bool ReaderPool::pump(std::chrono::milliseconds wait) {
+/* Gives work to all; whether any has so little that it could run out of it. */
+bool ReaderPool::supplyAll() {
     bool isAnyShort = false;
-    bool isAnyAtWork = false;
     for (const auto &reader : readers_) {
         supply(*reader);
         if (reader->process) {
             reader->process->send();
         }
         isAnyShort = isAnyShort || reader->line.size() <= kShortLine;
-        isAnyAtWork = isAnyAtWork || !reader->line.empty();
     }
-    if (!isAnyAtWork) {
+    return isAnyShort;
+}
+
+bool ReaderPool::pump(std::chrono::milliseconds wait) {
+    const bool isAnyShort = supplyAll();
+    if (std::all_of(readers_.begin(), readers_.end(),
+                    [](const auto &reader) { return reader->line.empty(); })) {
         return false;
     }
     // With work in every line, waking up for each answer would cost the readers a processor.

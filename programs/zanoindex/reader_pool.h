@@ -44,6 +44,7 @@ class ReaderPool {
     using Clock = std::chrono::steady_clock;
 
     void supply(Reader &reader);
+    bool supplyAll();
     std::optional<ListedFile> nextJob();
     void start(Reader &reader);
     void listen(std::chrono::milliseconds wait);

@@ -44,6 +44,7 @@ StopRequest::StopRequest() {
         if (action.sa_handler != SIG_IGN) {
             action = {};
             action.sa_handler = noteStop;
+            action.sa_flags = SA_RESTART;  // what waits with poll() is woken all the same
             sigaction(number, &action, nullptr);
         }
     }

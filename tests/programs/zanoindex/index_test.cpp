@@ -125,7 +125,9 @@ std::string Process::readLine() {
 
 Ended Process::wait() {
     Ended ended;
-    ended.out = out_ + readAll(output_);
+    while (readMore()) {
+    }
+    ended.out = out_;
     int status = 0;
     if (isTerminal_) {
         ended.err = readAll(errors_);  // ends when the process has

@@ -305,6 +305,15 @@ TEST_F(ScanTest, DatabaseThatCannotBeUsed) {
     EXPECT_NE(other.err, "");
 }
 
+TEST_F(ScanTest, OutputThatCannotBeWritten) {
+    add("x.mp3");
+    const auto ended = Process("/bin/sh", {"sh", "-c", "exec \"$0\" \"$@\" >/dev/full",
+                                           ZANOINDEX_PROGRAM, "--database", location(), music()})
+                           .wait();
+    EXPECT_EQ(ended.status, 1);
+    EXPECT_NE(ended.err.find("standard output: No space left"), std::string::npos) << ended.err;
+}
+
 TEST_F(ScanTest, Quiet) {
     add("x.mp3");
     const auto ended = run({"-q", music()});

@@ -66,7 +66,7 @@ TEST_F(TagsTest, TextsThatAreNotUtf8) {
     ASSERT_EQ(latin.size(), kTitle.size() - 1);
     const auto padded = std::string(latin) + "s";
     std::vector<std::string> expected;
-    for (const char *suffix : {"flac", "m4a", "mp3", "oga", "ogg", "opus", "spx", "wav"}) {
+    for (const char *suffix : {"flac", "m4a", "mp3", "oga", "ogg", "opus", "spx", "wav", "wv"}) {
         const auto name = std::string("a.") + suffix;
         write(music() + "/" + name, replaced(contentOf(sample(suffix)), kTitle, padded));
         expected.push_back(name + "|Sødmé Lieds|Øyvind");
