@@ -1,8 +1,8 @@
 /* usage: library_bench CATALOGUE [Google Benchmark's options]
  *
- * Asks the library what a web front asks, over a catalogue made by make_catalogue, beside the best
- * statements that can be written by hand for the same rows, and prints the ratios. The setting and
- * the music link that the library reads are written below the build's own root.
+ * Asks the library what a web front asks, over a catalogue made by generate_catalogue, beside the
+ * best statements that can be written by hand for the same rows, and prints the ratios. The setting
+ * and the music link that the library reads are written below the build's own root.
  */
 #include <benchmark/benchmark.h>
 #include <vorelix/vorelix.h>

@@ -1,4 +1,4 @@
-/* usage: make_catalogue LOCATION COUNT   (sqlite:/path/to/new.db 1000000) */
+/* usage: generate_catalogue LOCATION COUNT   (sqlite:/path/to/new.db 1000000) */
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
@@ -8,7 +8,7 @@
 int main(int argc, char **argv) {
     const long count = argc == 3 ? std::strtol(argv[2], nullptr, 10) : 0;
     if (count <= 0) {
-        std::fputs("usage: make_catalogue LOCATION COUNT\n", stderr);
+        std::fputs("usage: generate_catalogue LOCATION COUNT\n", stderr);
         return 2;
     }
     try {
@@ -25,7 +25,7 @@ int main(int argc, char **argv) {
         std::printf("with indexes: %.1f s\n", seconds());
         return 0;
     } catch (const std::exception &error) {
-        std::fprintf(stderr, "make_catalogue: %s\n", error.what());
+        std::fprintf(stderr, "generate_catalogue: %s\n", error.what());
         return 1;
     }
 }
