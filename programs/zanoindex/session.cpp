@@ -10,8 +10,9 @@ void Session::fileFailed(const std::string &path, const std::string &reason) {
 }
 
 void Session::folderFailed(const std::string &path, const std::string &reason) {
-    progress.message(printable(path) + ": " + reason);
-    summary.folders.push_back({path, reason});
+    const std::string shown = path.empty() ? "/" : path;  // the root of all
+    progress.message(printable(shown) + ": " + reason);
+    summary.folders.push_back({shown, reason});
 }
 
 }  // namespace zano::index
