@@ -9,7 +9,6 @@
 #include "commands.h"
 #include "failure.h"
 #include "options.h"
-#include "text.h"
 
 namespace {
 
