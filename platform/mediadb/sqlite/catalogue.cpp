@@ -104,19 +104,21 @@ class SqliteCatalogue : public Catalogue {
 
     ~SqliteCatalogue() override { SqliteCatalogue::rollback(); }
 
+    /* The range ends at "folder0", '0' being the character behind '/'. It comes from the index in
+     * order, and holds a few neighbours such as "folder-b", which are passed over. */
     void forEachFile(const std::string &folder, const FileCallback &callback) override {
-        std::string sql = "SELECT path, size, modified, changed FROM songs";
-        const std::string prefix = folder + "/";
-        const std::string end = folder + "0";  // '0' is the character behind '/'
-        if (!folder.empty()) {
-            sql += " WHERE (path>=?1 AND path<?2) OR path=?3";
-        }
-        Statement rows = prepare(sql + " ORDER BY path");
-        if (!folder.empty()) {
-            rows.bind(1, prefix).bind(2, end).bind(3, folder);
+        const bool isAll = folder.empty();
+        Statement rows = prepare(std::string("SELECT path, size, modified, changed FROM songs") +
+                                 (isAll ? "" : " WHERE path>=?1 AND path<?2") + " ORDER BY path");
+        const std::string end = folder + "0";
+        if (!isAll) {
+            rows.bind(1, std::string_view(folder)).bind(2, std::string_view(end));
         }
         while (rows.step()) {
-            callback(rows.text(0), {rows.integer(1), rows.integer(2), rows.integer(3)});
+            const std::string_view path = rows.text(0);
+            if (isAll || path.size() == folder.size() || path[folder.size()] == '/') {
+                callback(path, {rows.integer(1), rows.integer(2), rows.integer(3)});
+            }
         }
     }
 

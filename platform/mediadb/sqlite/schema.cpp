@@ -157,6 +157,18 @@ bool isEmptyFile(Connection &connection) {
            connection.integer("PRAGMA application_id") == 0;
 }
 
+/* SQLite reads a file first when it is asked something, and does not name it then. */
+template <typename Action>
+void namingFile(const std::string &path, Action action) {
+    try {
+        action();
+    } catch (const DatabaseError &error) {
+        const std::string words = error.what();
+        const bool isNamed = words.find(path) != std::string::npos;
+        throw DatabaseError(error.code(), isNamed ? words : path + ": " + words);
+    }
+}
+
 void migrate(Connection &connection, const std::string &path) {
     if (connection.integer("PRAGMA user_version") == kSchemaVersion &&
         connection.integer("PRAGMA application_id") == kApplicationId) {
@@ -197,13 +209,18 @@ Connection openForWriting(const std::string &path) {
     makeFolderOf(path);
     Connection connection(path, Connection::Mode::Create);
     prepareForUse(connection);
-    if (!isEmptyFile(connection)) {
-        checkVersion(connection, path);
-    }
+    namingFile(path, [&] {
+        if (!isEmptyFile(connection)) {
+            checkVersion(connection, path);
+        }
+    });
     connection.run("PRAGMA journal_mode=WAL");
     connection.run("PRAGMA synchronous=NORMAL");
     connection.run("PRAGMA cache_size=-65536");
     connection.run("PRAGMA temp_store=FILE");
+    /* The last writer leaves an empty journal: readers of another user cannot clear it, and each
+     * new one would have to read it through. */
+    connection.run("PRAGMA journal_size_limit=4194304");
     /* The journal stays when the last writer leaves, so that a reader that may not write in the
      * folder (a web front of another user) can still open the database. */
     int keep = 1;
@@ -215,11 +232,13 @@ Connection openForWriting(const std::string &path) {
 Connection openForReading(const std::string &path) {
     Connection connection(path, Connection::Mode::ReadOnly);
     prepareForUse(connection);
-    checkVersion(connection, path);
-    if (connection.integer("PRAGMA user_version") != kSchemaVersion) {
-        throw DatabaseError(KLIB_ERR_DATABASE_VERSION,
-                            path + " has an older schema; zanoindex brings it up to date");
-    }
+    namingFile(path, [&] {
+        checkVersion(connection, path);
+        if (connection.integer("PRAGMA user_version") != kSchemaVersion) {
+            throw DatabaseError(KLIB_ERR_DATABASE_VERSION,
+                                path + " has an older schema; zanoindex brings it up to date");
+        }
+    });
     connection.run("PRAGMA query_only=ON");
     connection.run("PRAGMA cache_size=-16384");
     connection.run("PRAGMA mmap_size=" + std::to_string(kMappedBytes));

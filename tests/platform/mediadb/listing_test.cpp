@@ -317,6 +317,23 @@ TEST_F(ListingTest, SearchIsWhatPeopleMeanByIt) {
     }
 }
 
+TEST_F(ListingTest, FilesOfAFolderAreThoseAtAndBelowIt) {
+    auto catalogue = openCatalogue(location());
+    put(*catalogue, {song("/m/a/2", "x"), song("/m/a-b/1", "x"), song("/m/a", "x"),
+                     song("/m/a/1", "x"), song("/m/b", "x"), song("/m/a0", "x")});
+    const auto below = [&catalogue](const std::string &folder) {
+        std::string paths;
+        catalogue->forEachFile(folder, [&paths](std::string_view path, const FileStamp &) {
+            paths.append(path).append(" ");
+        });
+        return paths;
+    };
+    EXPECT_EQ(below("/m/a"), "/m/a /m/a/1 /m/a/2 ");
+    EXPECT_EQ(below("/m"), "/m/a /m/a-b/1 /m/a/1 /m/a/2 /m/a0 /m/b ");
+    EXPECT_EQ(below("/other"), "");
+    EXPECT_EQ(below(""), below("/m"));
+}
+
 TEST_F(ListingTest, RandomGivesDifferentSongsEachOnce) {
     auto catalogue = openCatalogue(location());
     std::vector<Song> songs;
