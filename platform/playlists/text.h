@@ -1,0 +1,60 @@
+/* The bytes of a playlist as text: encodings, lines, letters of both cases. */
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace zano::playlists {
+
+/* The text of a file. UTF-16, told by its BOM or by the zeros of its first two characters, is
+ * converted into `converted`; everything else is a view of the bytes behind a UTF-8 BOM. */
+std::string_view fileText(std::string_view bytes, std::string &converted);
+
+bool isAscii(std::string_view text);
+bool isUtf8(std::string_view text);
+
+/* A character in UTF-8; U+FFFD for a number that is none. */
+std::string characterText(char32_t character);
+
+/* Windows-1252 as UTF-8. */
+std::string fromWindows1252(std::string_view text);
+
+/* UTF-8 composed (NFC) or decomposed (NFD); null when it is not UTF-8. */
+enum class Form { Composed, Decomposed };
+std::optional<std::string> normalised(std::string_view text, Form form);
+
+/* Only A-Z have two cases here. */
+bool equalsIgnoringCase(std::string_view a, std::string_view b);
+bool startsIgnoringCase(std::string_view text, std::string_view start);
+/* The first place of `part`, in small letters, or npos. */
+std::size_t findIgnoringCase(std::string_view text, std::string_view part);
+
+/* Without spaces and control characters at both ends. */
+std::string_view trimmed(std::string_view text);
+
+/* The number at the front of a text, 0 where there is none; what an int cannot hold becomes the
+ * nearest that it can. */
+int leadingInteger(std::string_view text);
+double leadingNumber(std::string_view text);
+
+/* The lines of a text; each ends at LF, CRLF, CR, or at NUL, which damaged files have behind
+ * their text. Takes time in proportion to the text, whatever the ends are. */
+class Lines {
+  public:
+    explicit Lines(std::string_view text) : text_(text) {}
+    /* false: there is no further line. */
+    bool next(std::string_view &line);
+
+  private:
+    static constexpr std::array kEnds = {'\n', '\r', '\0'};
+
+    std::string_view text_;
+    std::size_t at_ = 0;
+    std::array<std::size_t, kEnds.size()> nextEnd_{};  // of each kind; looked for when passed
+    bool isStarted_ = false;
+};
+
+}  // namespace zano::playlists

@@ -1,0 +1,1 @@
+Remember the milk
