@@ -121,10 +121,11 @@ class Questions {
         const std::string key = raw_.text(prepare("SELECT artist_key" + at));
         const long tail = raw_.number(prepare("SELECT tail_rank_down" + at), {});
         add(
-            "page at half depth by artist, descending/library",
+            "page at half depth by artist, descending, against a place known beforehand/library",
             [half] { return listed(nullptr, "lower(artist)", false, half, 50); }, 50);
         add(
-            "page at half depth by artist, descending/raw (place known)",
+            "page at half depth by artist, descending, against a place known beforehand/raw (place "
+            "known)",
             [this, artistDeep, key, tail] { return raw_.rows(artistDeep, {key}, {tail}); }, 50);
     }
 

@@ -103,6 +103,12 @@ class StatementCursor : public BaseCursor {
   public:
     StatementCursor(ReaderPool::Lease lease, Query asked)
         : BaseCursor(std::move(lease), std::move(asked)), sql_(dialect()) {}
+    /* Before the reader ends its snapshot, which an unfinished statement would keep open. */
+    ~StatementCursor() override {
+        if (statement_ != nullptr) {
+            statement_->reset();
+        }
+    }
 
     bool next(ZANO_MEDIA_INFO &row) override {
         reader().restartClock();

@@ -118,8 +118,7 @@ void SongPlan::addPage(Sql &sql, Page page) {
  * Walking costs a row for each song but needs no start; the index must find where the lists of
  * all tokens meet. */
 std::optional<std::int64_t> SongPlan::endOfWalk(Page page) {
-    const bool isOneList = grams_->isExact && terms_.size() == 1;
-    if (page.limit == 0 || isOneList || reader_.state().anchored != reader_.state().generation) {
+    if (page.limit == 0 || reader_.state().anchored != reader_.state().generation) {
         return std::nullopt;
     }
     const std::int64_t matches = estimatedMatches();

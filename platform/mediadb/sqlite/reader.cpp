@@ -84,9 +84,6 @@ bool Reader::allPathsBegin(const std::string &prefix) {
 }
 
 void Reader::endSnapshot() noexcept {
-    for (auto &[sql, statement] : statements_) {
-        statement.reset();
-    }
     try {
         statement("ROLLBACK").run();
     } catch (const std::exception &) {

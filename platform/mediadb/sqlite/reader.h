@@ -34,7 +34,7 @@ class Reader {
   public:
     explicit Reader(const std::string &path);
 
-    /* Everything read between the two is of one moment. */
+    /* Everything read between the two is of one moment. Statements are reset before the end. */
     void beginSnapshot();
     void endSnapshot() noexcept;
     const State &state() const { return state_; }
