@@ -97,8 +97,22 @@ class Questions {
         add(
             "page at half depth/library",
             [half] { return listed(nullptr, nullptr, true, half, 50); }, 50);
+        const int byAnchor =
+            prepare(select +
+                    "INDEXED BY songs_by_rank WHERE rank>=(SELECT rank FROM songs WHERE id=(SELECT "
+                    "song FROM "
+                    "anchors WHERE stored_order=1 AND place=?1)) ORDER BY rank LIMIT 50 OFFSET ?2");
         add(
-            "page at half depth/raw (place known)",
+            "page at half depth/raw (by anchor)",
+            [this, byAnchor, half] {
+                return raw_.rows(byAnchor, {}, {half / 128, half % 128});
+            },
+            50);
+        add(
+            "page at half depth, against a place known beforehand/library",
+            [half] { return listed(nullptr, nullptr, true, half, 50); }, 50);
+        add(
+            "page at half depth, against a place known beforehand/raw",
             [this, deep, rank] { return raw_.rows(deep, {}, {rank}); }, 50);
 
         const int byArtist = prepare(select +
