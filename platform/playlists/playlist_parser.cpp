@@ -6,9 +6,11 @@
 #include <zanoplatform/error.h>
 #include <zanoplatform/media_database.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
-#include <cstring>
+#include <cstdio>
+#include <span>
 #include <system_error>
 
 #include "format.h"
@@ -19,70 +21,78 @@
 namespace zano::playlists {
 namespace {
 
-class File {
+class Descriptor {
   public:
     /* Not blocking: a pipe of that name would be waited for. */
-    explicit File(const char *path) : descriptor_(open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {
+    explicit Descriptor(const char *path) : number_(open(path, O_RDONLY | O_CLOEXEC | O_NONBLOCK)) {
+        if (number_ == -1) {
+            const bool isMissing = errno == ENOENT || errno == ENOTDIR;
+            throwLastError(isMissing ? KLIB_ERR_PLAYLIST_MISSING : KLIB_ERR_PLAYLIST_UNREADABLE);
+        }
+    }
+    ~Descriptor() { close(number_); }
+    Descriptor(const Descriptor &) = delete;
+    Descriptor &operator=(const Descriptor &) = delete;
+
+    std::size_t size() const {
         struct stat file {};
-        if (descriptor_ == -1 || fstat(descriptor_, &file) == -1) {
-            fail(errno);
+        if (fstat(number_, &file) == -1) {
+            throwLastError(KLIB_ERR_PLAYLIST_UNREADABLE);
         }
         if (!S_ISREG(file.st_mode)) {
-            close(descriptor_);
             throw PlaylistError(KLIB_ERR_PLAYLIST_UNREADABLE, "not a regular file");
         }
-        size_ = static_cast<std::size_t>(file.st_size);
+        return static_cast<std::size_t>(file.st_size);
     }
-    ~File() { close(descriptor_); }
-    File(const File &) = delete;
-    File &operator=(const File &) = delete;
 
-    /* All of it; a file that grows meanwhile, up to the limit. */
-    std::string contents() const {
-        std::string bytes(std::min(size_, kMaxFileBytes) + 1, '\0');
-        std::size_t length = 0;
-        for (;;) {
-            const ssize_t taken = read(descriptor_, bytes.data() + length, bytes.size() - length);
-            if (taken == -1 && errno == EINTR) {
-                continue;
-            }
-            if (taken == -1) {
-                throw PlaylistError(KLIB_ERR_PLAYLIST_UNREADABLE, describe(errno));
-            }
-            length += static_cast<std::size_t>(taken);
-            if (length > kMaxFileBytes) {
-                throw PlaylistError(KLIB_ERR_PLAYLIST_TOO_LARGE, "more than 64 MiB");
-            }
-            if (taken == 0) {
-                bytes.resize(length);
-                return bytes;
-            }
-            bytes.resize(std::max(bytes.size(), length + 1));
+    /* The number of bytes taken; 0: the end. */
+    std::size_t read(std::span<char> part) const {
+        ssize_t taken = -1;
+        do {
+            taken = ::read(number_, part.data(), part.size());
+        } while (taken == -1 && errno == EINTR);
+        if (taken == -1) {
+            throwLastError(KLIB_ERR_PLAYLIST_UNREADABLE);
         }
+        return static_cast<std::size_t>(taken);
     }
 
   private:
-    static std::string describe(int error) { return std::generic_category().message(error); }
-
-    [[noreturn]] void fail(int error) const {
-        if (descriptor_ != -1) {
-            close(descriptor_);
-        }
-        throw PlaylistError(error == ENOENT || error == ENOTDIR ? KLIB_ERR_PLAYLIST_MISSING
-                                                                : KLIB_ERR_PLAYLIST_UNREADABLE,
-                            describe(error));
+    [[noreturn]] static void throwLastError(int code) {
+        throw PlaylistError(code, std::generic_category().message(errno));
     }
 
-    int descriptor_;
-    std::size_t size_ = 0;
+    int number_;
 };
 
+/* All of a file; of one that grows meanwhile, up to the limit. */
+std::string contentsOf(const char *path) {
+    const Descriptor file(path);
+    std::string bytes(std::min(file.size(), kMaxFileBytes) + 1, '\0');
+    std::size_t length = 0;
+    for (;;) {
+        const std::size_t taken = file.read(std::span(bytes).subspan(length));
+        length += taken;
+        if (length > kMaxFileBytes) {
+            throw PlaylistError(KLIB_ERR_PLAYLIST_TOO_LARGE, "more than 64 MiB");
+        }
+        if (taken == 0) {
+            bytes.resize(length);
+            return bytes;
+        }
+        if (length == bytes.size()) {
+            bytes.resize(length * 2);
+        }
+    }
+}
+
 RecordList readFile(const char *path, const char *fields, int &total) {
-    const std::string bytes = File(path).contents();
+    const std::string bytes = contentsOf(path);
     std::string converted;
     Playlist playlist;
     readPlaylist(fileText(bytes, converted), path, playlist);
-    const std::string_view folder = std::string_view(path, strrchr(path, '/') - path);
+    const std::string_view file = path;
+    const std::string_view folder = file.substr(0, file.rfind('/'));
     const Fields wanted(fields != nullptr ? fields : "");
     return Resolver(folder, playlist, wanted).records(total);
 }
