@@ -47,6 +47,8 @@ typedef struct MEDIA_DB_RESULT {
     void *cursor;
 } MEDIA_DB_RESULT;
 
+VORELIX_STATIC_ASSERT(offsetof(MEDIA_DB_RESULT, rowCount) == 12, "the fourth field of 32 bits");
+
 /* Opens a query.
  *   table      a table kind
  *   select     the columns wanted; null or "*" for all
