@@ -188,8 +188,11 @@ std::vector<std::string> Locations::otherPaths(const Entry &entry) const {
             }
         }
     }
-    addChanged(paths, [](const std::string &text) { return normalised(text, Form::Composed); });
-    addChanged(paths, [](const std::string &text) { return normalised(text, Form::Decomposed); });
+    for (const Form form : {Form::Composed, Form::Decomposed}) {
+        addChanged(paths, [form](const std::string &text) {
+            return isAscii(text) ? std::nullopt : normalised(text, form);
+        });
+    }
     paths.erase(paths.begin());
     return paths;
 }

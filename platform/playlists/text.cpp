@@ -1,19 +1,13 @@
 #include "text.h"
 
-#include <utf8proc.h>
-
 #include <algorithm>
 #include <charconv>
 #include <climits>
 #include <cmath>
-#include <cstdlib>
-#include <memory>
-#include <new>
+#include <optional>
 
 namespace zano::playlists {
 namespace {
-
-constexpr char32_t kReplacement = U'\uFFFD';
 
 /* 0x80 to 0x9F; five of them are not assigned and stay control characters. */
 constexpr std::array<char16_t, 32> kWindows1252 = {
@@ -30,10 +24,11 @@ constexpr bool isHighByte(char c) {
 }
 
 void append(std::string &text, char32_t character) {
-    std::array<utf8proc_uint8_t, 4> bytes{};
-    const auto length =
-        utf8proc_encode_char(static_cast<utf8proc_int32_t>(character), bytes.data());
-    text.append(reinterpret_cast<const char *>(bytes.data()), static_cast<std::size_t>(length));
+    if (character < 0x80) {
+        text.push_back(static_cast<char>(character));  // NUL too, which ends lines
+    } else {
+        text.append(characterText(character));
+    }
 }
 
 struct Utf16 {
@@ -58,7 +53,7 @@ struct Utf16 {
                 character = 0x10000 + ((character - 0xD800) << 10) + (low - 0xDC00);
                 ++i;
             } else if (isSurrogate) {
-                character = kReplacement;
+                character = 0xFFFD;
             }
             append(text, character);
         }
@@ -81,10 +76,6 @@ std::optional<Utf16> asUtf16(std::string_view bytes) {
     return std::nullopt;
 }
 
-struct FreeText {
-    void operator()(utf8proc_uint8_t *text) const { std::free(text); }
-};
-
 }  // namespace
 
 std::string_view fileText(std::string_view bytes, std::string &converted) {
@@ -96,31 +87,8 @@ std::string_view fileText(std::string_view bytes, std::string &converted) {
     return bytes.substr(0, kBom.size()) == kBom ? bytes.substr(kBom.size()) : bytes;
 }
 
-std::string characterText(char32_t character) {
-    const bool isValid =
-        character != 0 && utf8proc_codepoint_valid(static_cast<utf8proc_int32_t>(character));
-    std::string text;
-    append(text, isValid ? character : kReplacement);
-    return text;
-}
-
 bool isAscii(std::string_view text) {
     return std::none_of(text.begin(), text.end(), isHighByte);
-}
-
-bool isUtf8(std::string_view text) {
-    const auto *at = reinterpret_cast<const utf8proc_uint8_t *>(text.data());
-    auto left = static_cast<utf8proc_ssize_t>(text.size());
-    while (left > 0) {
-        utf8proc_int32_t character = 0;
-        const auto length = *at < 0x80 ? 1 : utf8proc_iterate(at, left, &character);
-        if (length < 0) {
-            return false;
-        }
-        at += length;
-        left -= length;
-    }
-    return true;
 }
 
 std::string fromWindows1252(std::string_view text) {
@@ -131,22 +99,6 @@ std::string fromWindows1252(std::string_view text) {
         append(utf8, byte >= 0x80 && byte < 0xA0 ? kWindows1252.at(byte - 0x80U) : byte);
     }
     return utf8;
-}
-
-std::optional<std::string> normalised(std::string_view text, Form form) {
-    const auto options = static_cast<utf8proc_option_t>(
-        UTF8PROC_STABLE | (form == Form::Composed ? UTF8PROC_COMPOSE : UTF8PROC_DECOMPOSE));
-    utf8proc_uint8_t *result = nullptr;
-    const auto length = utf8proc_map(reinterpret_cast<const utf8proc_uint8_t *>(text.data()),
-                                     static_cast<utf8proc_ssize_t>(text.size()), &result, options);
-    const std::unique_ptr<utf8proc_uint8_t, FreeText> owned(result);
-    if (length == UTF8PROC_ERROR_NOMEM) {
-        throw std::bad_alloc();
-    }
-    if (length < 0) {
-        return std::nullopt;
-    }
-    return std::string(reinterpret_cast<const char *>(result), static_cast<std::size_t>(length));
 }
 
 bool equalsIgnoringCase(std::string_view a, std::string_view b) {

@@ -3,9 +3,10 @@
 
 #include <array>
 #include <cstddef>
-#include <optional>
 #include <string>
 #include <string_view>
+
+#include "text/utf8.h"
 
 namespace zano::playlists {
 
@@ -14,17 +15,9 @@ namespace zano::playlists {
 std::string_view fileText(std::string_view bytes, std::string &converted);
 
 bool isAscii(std::string_view text);
-bool isUtf8(std::string_view text);
-
-/* A character in UTF-8; U+FFFD for a number that is none. */
-std::string characterText(char32_t character);
 
 /* Windows-1252 as UTF-8. */
 std::string fromWindows1252(std::string_view text);
-
-/* UTF-8 composed (NFC) or decomposed (NFD); null when it is not UTF-8. */
-enum class Form { Composed, Decomposed };
-std::optional<std::string> normalised(std::string_view text, Form form);
 
 /* Only A-Z have two cases here. */
 bool equalsIgnoringCase(std::string_view a, std::string_view b);

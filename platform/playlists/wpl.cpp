@@ -15,6 +15,8 @@ constexpr auto kNone = std::string_view::npos;
 /* What the library's writer begins with, and no other program does. */
 constexpr std::string_view kOwnStart =
     "<?wpl version=\"1.0\"?>\r\n<smil>\r\n<head></head>\r\n<body>\r\n<seq>\r\n";
+/* What no value goes across. */
+constexpr std::string_view kLineEnds("\r\n\0", 3);
 constexpr std::string_view kOwnEntryStart = "<media src=\"";
 constexpr std::string_view kOwnEntryEnd = "\"/>";
 
@@ -161,13 +163,13 @@ class Scanner {
         const std::size_t start = rest_.find_first_not_of(" \t\r\n", equals + 1);
         rest_.remove_prefix(std::min(start, rest_.size()));
         if (rest_.empty() || (rest_.front() != '"' && rest_.front() != '\'')) {
-            return rest_.empty() ? std::nullopt : std::optional(takeUpTo(" \t\r\n><"));
+            return rest_.empty() ? std::nullopt : std::optional(takeUpTo({" \t><\r\n\0", 7}));
         }
         const char quote = rest_.front();
         rest_.remove_prefix(1);
         const std::size_t end = rest_.find(quote);
         /* A quote that is missing must not cost the entries behind it. */
-        const std::size_t limit = std::min(rest_.find_first_of("\r\n"), rest_.find(kElement));
+        const std::size_t limit = std::min(rest_.find_first_of(kLineEnds), rest_.find(kElement));
         if (end > limit) {
             return withoutEnd(takeTo(limit));
         }

@@ -3,6 +3,7 @@
 
 #include "music.h"
 #include "playlist.h"
+#include "support/failing_allocator.h"
 
 namespace {
 int openedQueries = 0;
@@ -132,6 +133,23 @@ TEST_F(ParserTest, LinesThatNoPathCanHoldCostNoOther) {
         EXPECT_LT(text.size(), 5000U) << line.substr(0, 20);
     }
     EXPECT_EQ(dump(write("long.m3u", longest + "\n")), "     ~/" + longest + "|||||0|0|0|0\n");
+}
+
+TEST_F(ParserTest, WithoutMemoryForARecordTheWholeListFails) {
+    const std::string path =
+        write("memory.m3u", "a & b.mp3\na & b.mp3\nloose.mp3\n#hash.mp3\nhttp://a/\n");
+    int failures = 0;
+    for (int after = 0;; ++after) {
+        failing_allocator::failOnSize(sizeof(ZANO_PLAYLIST_REC), after);
+        const std::string text = dump(path);
+        if (!failing_allocator::hasFailed()) {
+            break;
+        }
+        EXPECT_EQ(text, "error 200 out of memory while reading a playlist\n");
+        ++failures;
+    }
+    EXPECT_GE(failures, 5);
+    failing_allocator::failOnSize(0);
 }
 
 /* Titles are cut between characters. */
