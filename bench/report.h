@@ -10,7 +10,7 @@
 namespace zano::bench {
 
 /* Benchmarks are named "question/library" and "question/raw", "question/raw 2" and so on; with
- * several raw ones the fastest counts. Medians over the repetitions are compared. */
+ * several raw ones the fastest counts. The least times of all repetitions are compared. */
 class RatioReporter : public benchmark::BenchmarkReporter {
   public:
     bool ReportContext(const Context &context) override;
