@@ -32,12 +32,12 @@ constexpr std::array kEngines = {
 /* The engine that a location names, and the location without the engine's name. */
 std::pair<const EngineKind *, std::string> engineOf(const std::string &location) {
     for (const EngineKind &kind : kEngines) {
-        if (location.compare(0, kind.scheme.size(), kind.scheme) == 0) {
+        if (location.compare(0, kind.scheme.size() + 1, std::string(kind.scheme) + "/") == 0) {
             return {&kind, location.substr(kind.scheme.size())};
         }
     }
     throw DatabaseError(KLIB_ERR_BAD_CONFIGURATION,
-                        "the setting mediadb is not \"sqlite:\" and a path: " + location);
+                        "the setting mediadb is not \"sqlite:\" and an absolute path: " + location);
 }
 
 /* The engine of the current settings. They are looked at again when their file changes, so that
@@ -202,7 +202,10 @@ int MediaInfoDBSave(int table, const ZANO_MEDIA_INFO *row) {
 int MediaInfoDBUpdate(int table, const ZANO_MEDIA_INFO *row) {
     return guarded([&] {
         requirePlaylists(table, row);
-        return currentEngine()->updatePlaylist(*row) ? 0 : -1;
+        if (!currentEngine()->updatePlaylist(*row)) {
+            throw DatabaseError(KLIB_ERR_BAD_PARAMETER, "no playlist has this id");
+        }
+        return 0;
     });
 }
 

@@ -10,6 +10,9 @@ namespace {
 
 constexpr size_t kMaxBytes = 8U << 20;
 constexpr int kMaxDepth = 100;
+/* What one query may cost before its time limit can stop it. */
+constexpr size_t kMaxPatternBytes = 64U << 10;
+constexpr int kMaxPredicates = 500;
 
 constexpr std::array<std::string_view, 2> kFunctions = {"lower", "length"};
 constexpr std::array<std::pair<std::string_view, std::string_view>, 7> kComparisons = {{
@@ -120,6 +123,10 @@ class ConditionParser {
             tokens_.expectSign(")");
             return inner;
         }
+        if (++predicates_ > kMaxPredicates) {
+            throw QueryError("the query has more than " + std::to_string(kMaxPredicates) +
+                             " comparisons");
+        }
         Expression left = operand();
         if (tokens_.peek().kind == Token::Kind::Sign) {
             for (const auto &[sign, operation] : kComparisons) {
@@ -170,6 +177,9 @@ class ConditionParser {
             tokens_.refuse("a pattern in quotes");
         }
         Expression pattern;
+        if (tokens_.peek().value.size() > kMaxPatternBytes) {
+            throw QueryError("the query has a pattern of more than 64 KB");
+        }
         pattern.value = tokens_.takeText();
         expression.parts.push_back(std::move(pattern));
     }
@@ -236,6 +246,7 @@ class ConditionParser {
     Table table_;
     Tokenizer tokens_;
     int depth_ = 0;
+    int predicates_ = 0;
 };
 
 Column takeColumn(Table table, Tokenizer &tokens) {

@@ -16,7 +16,9 @@ std::string_view orderColumn(Column column) {
 Sql &Sql::bind(Value value) {
     values_.push_back(std::move(value));
     text_.push_back(dialect_->parameterSign);
-    text_.append(std::to_string(values_.size()));
+    if (dialect_->parametersAreNumbered) {
+        text_.append(std::to_string(values_.size()));
+    }
     return *this;
 }
 
@@ -170,7 +172,7 @@ void Sql::addLike(const Expression &expression, std::string_view qualifier) {
     if (const auto text = pattern.exact()) {
         addSubject();
         add("=").bind(std::string(*text));
-    } else if (const auto part = pattern.part()) {
+    } else if (const auto part = pattern.part(); part && expression.ignoreCase) {
         add(dialect_->position).add("(");
         addSubject();
         add(",").bind(std::string(*part)).add(")>0");

@@ -10,9 +10,10 @@
 namespace zano::mediadb {
 
 struct Dialect {
-    /* "?1", "$1": the sign before the number of a parameter. */
+    /* "$1", or "?" alone: SQLite keeps a list of numbered ones, which it walks for each. */
     char parameterSign;
-    /* Functions of the engine: position of a text in a text (0: not there), the folded key of a
+    bool parametersAreNumbered;
+    /* Functions of the engine: position of a key in a key (0: not there), the folded key of a
      * text, its small letters, its number of characters. */
     std::string_view position;
     std::string_view fold;

@@ -208,17 +208,12 @@ class SqliteCatalogue : public Catalogue {
             return;
         }
         begin();
-        if (!isOrdered_) {
-            buildOrders(progress);
+        try {
+            finishBatch(progress);
+        } catch (...) {
+            rollback();
+            throw;
         }
-
-        if (std::abs(songs_ - state("counted")) > songs_ / kRecountShare) {
-            countGrams();
-        }
-
-        setAnchors();
-
-        commit();
         connection_.run("PRAGMA wal_checkpoint(PASSIVE)");
     }
 
@@ -260,6 +255,17 @@ class SqliteCatalogue : public Catalogue {
     }
 
   private:
+    void finishBatch(const Progress &progress) {
+        if (!isOrdered_) {
+            buildOrders(progress);
+        }
+        if (std::abs(songs_ - state("counted")) > songs_ / kRecountShare) {
+            countGrams();
+        }
+        setAnchors();
+        commit();
+    }
+
     Statement prepare(std::string_view sql) { return connection_.prepare(sql, true); }
 
     [[noreturn]] static void damaged(const std::string &how) {

@@ -118,6 +118,7 @@ class StatementCursor : public BaseCursor {
         if (statement_ == nullptr) {
             statement_ = &reader().statement(sql_);
         }
+        isDone_ = true;  // also when the step fails: the statement would begin anew
         isDone_ = !statement_->step();
         if (!isDone_) {
             putRow(*statement_, query().select, row);
@@ -287,7 +288,7 @@ class RandomCursor : public BaseCursor {
     }
 
     void shuffle() {
-        const Sql sql = plan_.ids();
+        const Sql sql = plan_.ids(query().distinct);
         {
             Using rows(reader().statement(sql));
             while (rows->step()) {

@@ -29,13 +29,9 @@ Sql newSql(std::string_view text) {
 }  // namespace
 
 const Dialect &dialect() {
-    static constexpr Dialect kDialect{'?',
-                                      "instr",
-                                      "zano_fold",
-                                      "zano_lower",
-                                      "length",
-                                      "zano_like",
-                                      "SELECT value FROM json_each"};
+    static constexpr Dialect kDialect{
+        '?',          false,    "instr",     "zano_fold",
+        "zano_lower", "length", "zano_like", "SELECT value FROM json_each"};
     return kDialect;
 }
 
@@ -238,18 +234,21 @@ Sql SongPlan::distinctPage(std::string_view columns, const Query &query) {
     sql.add(" FROM songs WHERE songs.id IN (SELECT min(songs.id)");
     addSource(sql, grams_.has_value());
     sql.add(" GROUP BY songs.").add(info.name).add(") ORDER BY ");
-    if (!query.order.empty()) {
-        sql.addOrder(query.order, "songs.");
-        sql.add(", ");
-    }
-    sql.add("songs.").add(info.name).add(", songs.id");
+    /* By the values themselves where no order is given, as the kept values come. */
+    sql.addOrder(query.order.empty() ? std::vector<OrderTerm>{{*query.distinct}} : query.order,
+                 "songs.");
+    const bool isDescending = !query.order.empty() && query.order[0].descending;
+    sql.add(", songs.").add(info.name).add(isDescending ? " DESC, songs.id" : ", songs.id");
     addPage(sql, {query.offset, query.limit});
     return sql;
 }
 
-Sql SongPlan::ids() {
-    Sql sql = newSql("SELECT songs.id");
+Sql SongPlan::ids(std::optional<Column> distinct) {
+    Sql sql = newSql(distinct ? "SELECT min(songs.id)" : "SELECT songs.id");
     addSource(sql, grams_.has_value());
+    if (distinct) {
+        sql.add(" GROUP BY songs.").add(columnInfo(*distinct).name);
+    }
     return sql;
 }
 

@@ -29,8 +29,8 @@ class SongPlan {
     Sql page(std::string_view columns, const Query &query);
     /* SELECT `columns` of the first song of each value of the distinct column. */
     Sql distinctPage(std::string_view columns, const Query &query);
-    /* SELECT the ids of all rows, in no order. */
-    Sql ids();
+    /* SELECT the ids of all rows, or of the first of each distinct value, in no order. */
+    Sql ids(std::optional<Column> distinct);
     std::int64_t count(std::optional<Column> distinct);
 
     bool isUnconditional() const { return conjuncts_.empty(); }

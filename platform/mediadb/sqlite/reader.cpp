@@ -14,8 +14,9 @@ namespace {
 
 constexpr size_t kMaxStatements = 64;
 constexpr size_t kMaxIdleReaders = 4;
-/* Steps of SQLite's machine between two looks at the clock: some microseconds. */
-constexpr int kStepsBetweenLooks = 2000;
+/* Steps of SQLite's machine between two looks at the clock: a few rows, since a step may match a
+ * pattern with a long text. */
+constexpr int kStepsBetweenLooks = 100;
 
 }  // namespace
 

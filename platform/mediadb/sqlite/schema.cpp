@@ -59,9 +59,9 @@ constexpr std::array<std::string_view, 13> kReadableTables = {
     "songs",     "playlists",     "facets",       "anchors",   "gram_counts",
     "state",     "grams",         "grams_data",   "grams_idx", "grams_config",
     "json_each", "sqlite_master", "grams_docsize"};
-constexpr std::array<std::string_view, 15> kCallableFunctions = {
-    "instr", "zano_like", "zano_fold", "zano_lower", "length",    "count", "min",  "max",
-    "-",     "match",     "fts5",      "json_each",  "json_type", "abs",   "total"};
+constexpr std::array<std::string_view, 16> kCallableFunctions = {
+    "random", "instr", "zano_like", "zano_fold", "zano_lower", "length",    "count", "min",
+    "max",    "-",     "match",     "fts5",      "json_each",  "json_type", "abs",   "total"};
 
 int authorize(void *, int action, const char *first, const char *second, const char *,
               const char *) {
@@ -140,10 +140,10 @@ void prepareForUse(Connection &connection) {
 
 void checkVersion(Connection &connection, const std::string &path) {
     const std::int64_t application = connection.integer("PRAGMA application_id");
-    if (application != kApplicationId) {
+    const std::int64_t version = connection.integer("PRAGMA user_version");
+    if (application != kApplicationId || version < 1) {
         throw DatabaseError(KLIB_ERR_DATABASE_OPEN, path + " is not a media database");
     }
-    const std::int64_t version = connection.integer("PRAGMA user_version");
     if (version > kSchemaVersion) {
         throw DatabaseError(KLIB_ERR_DATABASE_VERSION,
                             path + " was made by a newer version of this program (schema " +
@@ -154,7 +154,8 @@ void checkVersion(Connection &connection, const std::string &path) {
 
 bool isEmptyFile(Connection &connection) {
     return connection.integer("SELECT count(*) FROM sqlite_master") == 0 &&
-           connection.integer("PRAGMA application_id") == 0;
+           connection.integer("PRAGMA application_id") == 0 &&
+           connection.integer("PRAGMA user_version") == 0;
 }
 
 /* SQLite reads a file first when it is asked something, and does not name it then. */

@@ -357,6 +357,12 @@ TEST_F(ListingTest, RandomGivesDifferentSongsEachOnce) {
         EXPECT_EQ(std::stoi(path.substr(3)) % 2, 1);
     }
     EXPECT_EQ(rows(nullptr, "RANDOM()", {330, 50}).size(), 3U);
+    EXPECT_EQ(rows(nullptr, "RANDOM()", {0, 0}, "title", "title").size(), 2U);
+    EXPECT_EQ(rows(nullptr, nullptr, {0, 0}, "title", "title"),
+              rows("id>0", nullptr, {0, 0}, "title", "title"));
+    MEDIA_DB_RESULT *playlists = MediaInfoDBOpen(3, "*", nullptr, nullptr, "RANDOM()", 0, 0, 0);
+    EXPECT_NE(playlists, nullptr) << KLIBCErrTextGet();
+    MediaInfoDBClose(playlists);
 }
 
 TEST_F(ListingTest, RecordsHoldTheRowAndNothingElse) {
