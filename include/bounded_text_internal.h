@@ -1,13 +1,26 @@
-/* A text in a buffer of fixed size: Size - 1 bytes and a NUL. What does not fit is cut. */
+/* Texts in buffers of fixed size: what does not fit is cut. */
 #pragma once
 
 #include <algorithm>
 #include <array>
 #include <cstddef>
+#include <cstdio>
 #include <string_view>
 
 namespace vorelix {
 
+/* Null or "". */
+inline bool isEmpty(const char *text) {
+    return text == nullptr || *text == '\0';
+}
+
+/* Writes what fits of a text, and a NUL, into a buffer of `size` bytes; nothing when the size is
+ * below 1. */
+inline void writeText(char *out, int size, const char *text) {
+    std::snprintf(out, size > 0 ? static_cast<std::size_t>(size) : 0, "%s", text);
+}
+
+/* Size - 1 bytes and a NUL. */
 template <std::size_t Size>
 class BoundedText {
   public:

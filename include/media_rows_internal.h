@@ -46,8 +46,8 @@ inline constexpr int kNodeSize = sizeof(ZANO_PLAYLIST_REC);
  * is what allocateNode() returns: a malloc'd block of kNodeSize bytes or null. False when it
  * was null although a row was left; the list then holds the rows read before.
  *
- * The database writes each row into its node: a copy of 7 KB for each would cost as much as
- * reading it. */
+ * The database writes each row into its node, whole by its interface: a copy of 7 KB for each
+ * would cost as much as reading it. */
 template <typename Allocate>
 bool fetchRows(MEDIA_DB_RESULT *result, RecordList &list, Allocate allocateNode) {
     for (;;) {

@@ -2,8 +2,9 @@
  *
  * The library carries the server side of an audio application on a storage device. It has no
  * thread, timer or main loop of its own: a call runs to completion on the caller's thread, and
- * callers are meant to be single-threaded. Every failure of a flat function is written to the
- * system log at LOG_ERR. Lists that a function returns are the caller's.
+ * callers are meant to be single-threaded. A failure of a flat function is written to the system
+ * log at LOG_ERR unless its own comment says otherwise. Lists that a function returns are the
+ * caller's.
  */
 #ifndef VORELIX_H
 #define VORELIX_H

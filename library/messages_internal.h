@@ -49,4 +49,10 @@ inline constexpr LogMessage<int> kCountNoConditionAny{kUnit, "%s (%d) Failed to 
 inline constexpr LogMessage<int> kCountNoConditionColumn{kUnit, "%s (%d) Failed to alloc memory %d",
                                                          449};
 
+// ZANOPlaylistDBSave, ZANOPlaylistDBUpdate
+inline constexpr LogMessage<> kPlaylistNotInserted{
+    kUnit, "%s:%d Failed to insert into playlist table.", 499};
+inline constexpr LogMessage<> kPlaylistNotUpdated{kUnit, "%s:%d Failed to update playlist in DB.",
+                                                  525};
+
 }  // namespace vorelix::musiclib

@@ -118,9 +118,9 @@ int ZANOMusicListAll(ZANO_PLAYLIST_REC **list, int category, const char *keyword
     }
     OrderText order{};
     writeOrder(sortColumn, ascending != 0, order);
+    RecordList songs;  // before the result, which is closed first
     QueryResult result(MediaInfoDBOpen(MEDIA_TABLE_SONGS, "*", condition.get(), nullptr,
                                        order.data(), offset, limit, 0));
-    RecordList songs;
     // Intended and kept: a failed open is a success with an empty list, and is not logged.
     if (result != nullptr && !fetchNodes(result.get(), songs, kListNoNode)) {
         return -1;
@@ -143,7 +143,7 @@ int ZANOMusicGetPathById(char *out, int size, const char *id) {
         return -1;
     }
     ZANO_MEDIA_INFO song{};
-    MediaInfoDBGet(result.get(), &song);  // without a row the path stays empty
+    MediaInfoDBGet(result.get(), &song);  // intended: without a row the path stays empty
     return answerEscaped(std::move(result), song.path, out, size, kPathNotEscaped);
 }
 
@@ -161,7 +161,7 @@ int ZANOMusicGetKeyword(int category, char *out, int size, const char *condition
         return -1;
     }
     ZANO_MEDIA_INFO row{};
-    MediaInfoDBGet(result.get(), &row);  // without a row the value stays empty
+    MediaInfoDBGet(result.get(), &row);  // intended: without a row the value is empty
     return answerEscaped(std::move(result), row.title, out, size, kKeywordNotEscaped);
 }
 
@@ -172,13 +172,13 @@ int ZANOMusicBrowse(int table, ZANO_PLAYLIST_REC **list, const char *select, con
         return -1;
     }
     *list = nullptr;
+    RecordList rows;  // before the result, which is closed first
     QueryResult result(MediaInfoDBOpen(table, select != nullptr ? select : "*", condition, distinct,
                                        orderBy, offset, limit, 0));
     if (result == nullptr) {
         kBrowseNoDatabase(vorelix::shown(condition));
         return -1;
     }
-    RecordList rows;
     if (!fetchNodes(result.get(), rows, kBrowseNoNode)) {
         return -1;
     }

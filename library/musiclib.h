@@ -1,4 +1,5 @@
-/* Songs listed, searched, browsed and counted in the media database.
+/* Songs listed, searched, browsed and counted in the media database, and its table of playlists
+ * kept in step with the playlist files.
  *
  * Texts are UTF-8 and end with NUL; sizes are bytes, the NUL included, and a text that does not
  * fit its buffer is cut. A list comes as the address of the caller's head, which is null on
@@ -35,7 +36,8 @@ VORELIX_API int GenerateOrderString(const char *primary, char *out, int size);
 
 /* A page of songs.
  *   category       where the keyword is looked for: 1 title, 2 artist, 3 album, 4 genre, 5 any
- *                  of them; 0 ignores the keyword; every other code finds nothing
+ *                  of them; 0 ignores the keyword (which must still be one that can be
+ *                  escaped); every other code finds nothing
  *   keyword        any part of the column's text, taken literally but for % and _, the
  *                  database's wildcards; null or "": no search
  *   sortColumn     a column or an expression of one; exactly "random" for a random order; null
@@ -99,9 +101,28 @@ VORELIX_API int ZANOMusicBrowse(int table, ZANO_PLAYLIST_REC **list, const char 
  * cannot be escaped, or memory ran out; *count is untouched.
  *
  * This is not always the number of songs that ZANOMusicListAll lists, and is meant so: without a
- * keyword only the songs under the music root are counted, and backslashes of the keyword keep
- * their meaning as the database's escape character. */
+ * keyword only the songs under the music root are counted, while category 0 with a keyword counts
+ * every song; and backslashes of the keyword keep their meaning as the database's escape
+ * character. */
 VORELIX_API int ZANOPageTotalRowCount(int songs, int category, const char *keyword, int *count);
+
+/* The row of a playlist file, of which the path, title and album count, is inserted and the
+ * indexer told of the file. 0, whatever came of telling the indexer; -1 when the database does not
+ * take the row, which is logged. */
+VORELIX_API int ZANOPlaylistDBSave(const ZANO_MEDIA_INFO *row);
+
+/* Changes path, title and album of the playlist with the id of the row, and tells the indexer.
+ *   formerPath  where the file was before; null when it did not move
+ * 0, whatever came of telling the indexer; -1 when the database does not change the row, which is
+ * logged. */
+VORELIX_API int ZANOPlaylistDBUpdate(const ZANO_MEDIA_INFO *row, const char *formerPath);
+
+/* Removes the row of a playlist file, which itself is left alone, and tells the indexer. When the
+ * database fails to remove the row, the program /usr/zano/bin/zanoindex is asked to, and waited
+ * for: see ZANOExec (vorelix/misc/misc.h) for what that means to other threads. Returns what
+ * KLIBZanoFileIndexAdd (zanoplatform/media_database.h) returns: 0, or -1 when the indexer could
+ * not be told. A row that could not be removed is no failure, and nothing is logged. */
+VORELIX_API int ZANOPlaylistDBDelete(const char *path);
 
 VORELIX_C_API_END
 

@@ -18,7 +18,8 @@ int GenerateOrderString(const char *primary, char *out, int size) {
     vorelix::BoundedText<1024> order;
     order.append(first);
     for (const std::string_view column : kTieBreaks) {
-        // Letter for letter: "lower(title) desc" does not begin with "title", which so stays.
+        // Intended and kept: letter for letter, so "lower(title) desc" keeps "title", and always
+        // ascending, whatever the direction of the first term.
         if (!first.starts_with(column)) {
             order.append(order.empty() ? "" : ", ", column);
         }

@@ -1,12 +1,9 @@
 #include "search_internal.h"
 
-#include <unistd.h>
 #include <zanoplatform/sql_escape.h>
 
 #include <array>
 #include <cstddef>
-
-#include "system_paths_internal.h"
 
 namespace vorelix::musiclib {
 
@@ -25,15 +22,6 @@ constexpr std::array<const char *, 5> kColumns{"", "title", "artist", "album", "
 const char *columnOf(int category) {
     const auto index = static_cast<std::size_t>(category);
     return index < kColumns.size() ? kColumns.at(index) : "";
-}
-
-bool readMusicRoot(MusicRoot &root, const LogMessage<const char *> &failure) {
-    // The last byte stays the NUL, which readlink does not write.
-    if (readlink(ZANO_PATH_MUSIC_LINK, root.data(), root.size() - 1) == -1) {
-        failure(ZANO_PATH_MUSIC_LINK);
-        return false;
-    }
-    return true;
 }
 
 bool makeCondition(int category, const MusicRoot &root, const char *escapedKeyword, int bufferSize,

@@ -1,12 +1,15 @@
-/* The music root and the condition of a search, which listing and counting build alike. */
+/* The condition of a search, which listing and counting build alike. */
 #pragma once
 
-#include <array>
-
+#include "bounded_text_internal.h"
 #include "log_internal.h"
 #include "media_rows_internal.h"
+#include "music_root_internal.h"
 
 namespace vorelix::musiclib {
+
+using vorelix::isEmpty;
+using vorelix::MusicRoot;
 
 /* Search categories. Every other code searches a column without a name: the database refuses
  * that condition, which is how an unknown code is answered. Intended and kept. */
@@ -14,13 +17,6 @@ enum Category { kNoSearch = 0, kTitle = 1, kArtist = 2, kAlbum = 3, kGenre = 4, 
 
 /* The column of a category, "" when it has none. */
 const char *columnOf(int category);
-
-/* The folder that the music link points to. */
-using MusicRoot = std::array<char, 4096>;
-
-/* Reads the music link into a zero-filled buffer; false, and the failure logged, when it cannot
- * be read. */
-bool readMusicRoot(MusicRoot &root, const LogMessage<const char *> &failure);
 
 /* The messages of a condition that memory did not suffice for. */
 struct ConditionFailures {
@@ -33,9 +29,5 @@ struct ConditionFailures {
  * failure logged with bufferSize, when memory ran out. */
 bool makeCondition(int category, const MusicRoot &root, const char *escapedKeyword, int bufferSize,
                    const ConditionFailures &failures, HeapText &condition);
-
-inline bool isEmpty(const char *text) {
-    return text == nullptr || *text == '\0';
-}
 
 }  // namespace vorelix::musiclib

@@ -13,6 +13,7 @@
 
 #include "log_internal.h"
 #include "media_rows_internal.h"
+#include "playlists_internal.h"
 
 using vorelix::asInt;
 using vorelix::HeapText;
@@ -20,10 +21,10 @@ using vorelix::kNodeSize;
 using vorelix::LogMessage;
 using vorelix::QueryResult;
 using vorelix::RecordList;
+using vorelix::playlist::kUnit;
 
 namespace {
 
-constexpr const char *kUnit = "playlist.cpp";
 constexpr LogMessage<> kBadParameter{kUnit, "%s (%d) Bad parameter.", 97};
 constexpr LogMessage<int> kNoCondition{kUnit, "%s (%d) Failed to alloc memory %d", 104};
 constexpr LogMessage<const char *> kNoDatabase{kUnit, "%s (%d) Failed to open media database (%s).",
@@ -161,13 +162,13 @@ int ZANOMusicListGetByID(ZANO_PLAYLIST_REC **list, const char *ids) {
     if (condition == nullptr) {
         return -1;
     }
+    RecordList fetched;  // before the result, which is closed first
     QueryResult result(
         MediaInfoDBOpen(MEDIA_TABLE_SONGS, "*", condition.get(), nullptr, nullptr, 0, 0, 0));
     if (result == nullptr) {
         kNoDatabase(condition.get());
         return -1;
     }
-    RecordList fetched;
     if (!vorelix::fetchRows(result.get(), fetched, [] { return std::calloc(1, kNodeSize); })) {
         kNoNode(kNodeSize);
         return -1;

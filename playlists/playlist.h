@@ -1,4 +1,8 @@
-/* Lists of tracks and of playlists, and songs looked up by their ids.
+/* Lists of tracks and of playlists, songs looked up by their ids, and the catalogue of the shared
+ * playlists: the files that the media database has rows for.
+ *
+ * Texts are UTF-8 and end with NUL, paths any bytes but NUL. A size is that of the buffer in bytes,
+ * the NUL included: what does not fit is cut, and nothing is written when it is below 1.
  *
  * A list is its head pointer; null is the empty list and every function takes it. Nodes are
  * blocks of their own from malloc or calloc. A list belongs to the caller: track lists are
@@ -36,6 +40,85 @@ VORELIX_API ZANO_PLAYLIST *ZANOPlayListFree(ZANO_PLAYLIST *list);
  * out. When the string list cannot be made (zanoplatform/strings.h), the list is empty and the
  * result 0: intended and kept. */
 VORELIX_API int ZANOMusicListGetByID(ZANO_PLAYLIST_REC **list, const char *ids);
+
+/* The shared playlists of a list of ids, in the order of the database.
+ *   list   the caller's head; null on entry
+ *   ids    decimal ids separated by commas, "7,3,7"; put into the condition as they are, without
+ *          escaping, so that what is no list of ids makes the database refuse it
+ * 0: the list holds a node for each playlist found, of which only the path is filled. It is empty
+ * when none was found, and also, without a line in the log, when the database cannot be opened or
+ * refuses the ids. -1, logged, with *list null: a null list, null or empty ids, out of memory. */
+VORELIX_API int ZANOPlayListListGetByID(ZANO_PLAYLIST **list, const char *ids);
+
+/* The path of a shared playlist's file.
+ *   id         above 0
+ *   out, size  receive the path
+ * 0, or -1: an id below 1 or a null out, which are logged; no such playlist or no database, which
+ * are not. *out is untouched then. */
+VORELIX_API int ZANOPlaylistPathGet(int id, char *out, int size);
+
+/* The id of a shared playlist.
+ *   path       of its file, exactly as the database has it
+ *   out, size  receive the id as decimal text; 11 bytes always suffice
+ * 0, or -1: a null or empty path, a null out or out of memory, which are logged; no such playlist
+ * or no database, which are not. *out is untouched then. */
+VORELIX_API int ZANOPlaylistIDGet(const char *path, char *out, int size);
+
+/* The number of shared playlists, or the database's negative error. */
+VORELIX_API int ZANOPlaylistTotalGet(void);
+
+/* A page of the shared playlists under the music root, the folder that the link
+ * /var/services/music points to; ordered by title and album, without regard to case.
+ *   list           the caller's head; null on entry
+ *   offset, limit  the page; both 0: all of them
+ *   folderFilter   0: all; else only those whose album, the folder word, is "playlists" in any
+ *                  case
+ * 0: the list holds the playlists with id, path, title and album. It is empty when there is none,
+ * and also, without a line in the log, when the database cannot be opened. -1, with *list null:
+ * a null list (not logged), the music link cannot be read, out of memory. */
+VORELIX_API int ZANOPlaylistListAll(ZANO_PLAYLIST **list, int offset, int limit, int folderFilter);
+
+/* The title of a shared playlist.
+ *   id         as decimal text, of which what follows the digits is not read
+ *   out, size  receive the title
+ * 0, also when there is no such playlist or no database: *out is untouched then. -1, logged, for a
+ * null argument. */
+VORELIX_API int ZANOPlaylistTitleGet(const char *id, char *out, int size);
+
+/* The title of the shared playlist with this path. 0, or -1, logged, with *out untouched: a null or
+ * empty path, a null out, out of memory, no database, or no such playlist. */
+VORELIX_API int ZANOPlaylistTitleGetByPath(const char *path, char *out, int size);
+
+/* Removes the file of each node's path and, whether that worked or not, its row in the database
+ * (ZANOPlaylistDBDelete, vorelix/library/musiclib.h). The list itself is not freed. 0, whatever
+ * the removals gave; -1, logged, for a null list. */
+VORELIX_API int ZANOPlayListUnlink(const ZANO_PLAYLIST *list);
+
+/* Write a whole playlist file in place of what it held.
+ *   list     the entries; null for none
+ *   records  the same as an array that a null pointer ends; may not be null itself
+ *   path     absolute; what follows its last '.', in any case, is the form: wpl, m3u or pls. A file
+ *            with another ending is emptied, which is a success; without a '.' nothing is done,
+ *            and -1 returned without a line in the log.
+ * The entries are only read. Their paths are written from the folder of the playlist ("../a/b.mp3")
+ * but for web addresses (http://), files on USB volumes and what is no absolute path, which are
+ * written as they are; the last of these is logged for each entry. m3u also has the tags of those
+ * entries whose id is 0. Lines are cut to 4127 bytes, their ends included; wpl is not escaped.
+ *
+ * 0, or -1: a null array, a null or empty path, a file that cannot be opened, locked or unlocked;
+ * all logged. A writer that finds the file locked (flock) by another does not wait, and has emptied
+ * the file by then. Whether the bytes reached the disk is not looked at. Every call, a failed one
+ * included, ends with the mode of the path set to 0777; one that fails before it opens the file,
+ * for its arguments or the missing '.', closes descriptor 0 of the process. */
+VORELIX_API int ZANOWriteMusicPlaylist(const ZANO_PLAYLIST_REC *list, const char *path);
+VORELIX_API int ZANOWriteMusicPlaylistWithMediaList(ZANO_MEDIA_INFO **records, const char *path);
+
+/* Takes the first "/.." out of a path, with the component before it: "/a/b/../c" gives "/a/c". Only
+ * the first, and by its letters: "/a/b/..c" gives "/ac". A path without one is copied.
+ *   path       the first 4095 bytes are looked at
+ *   out, size  receive the result, and may not overlap the path
+ * 0; -1, logged, for a null argument or a size below 1. */
+VORELIX_API int ZANOPathRelativeToABS(const char *path, char *out, int size);
 
 VORELIX_C_API_END
 

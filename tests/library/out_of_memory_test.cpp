@@ -1,4 +1,5 @@
 #include <vorelix/library/musiclib.h>
+#include <vorelix/playlists/playlist.h>
 
 #include <cstddef>
 #include <functional>
@@ -52,6 +53,17 @@ TEST_F(MusicOutOfMemory, EachAllocationIsReported) {
         EXPECT_EQ(stand_in::takeTrace(), each.trace);
         EXPECT_EQ(list.head(), nullptr) << each.trace;
     }
+}
+
+/* Memory that is missing only behind the last row is not missed. */
+TEST_F(MusicOutOfMemory, ThatIsNotNeededIsNotMissed) {
+    stand_in::script().rows = {stand_in::row(1, "a"), stand_in::row(2, "b")};
+    failing_allocator::failOnSize(7344, 2);
+    List list;
+    EXPECT_EQ(ZANOMusicListAll(list.address(), 0, nullptr, "random", 1, 0, 0), 0);
+    EXPECT_TRUE(failing_allocator::hasFailed());
+    EXPECT_EQ(stand_in::takeTrace(), "open(0, \"*\", null, null, \"RANDOM()\", 0, 0, 0)\nclose\n");
+    EXPECT_EQ(ZANOPlaylistRecCount(list.head()), 2U);
 }
 
 }  // namespace

@@ -1,5 +1,7 @@
 #include "support/failing_allocator.h"
 
+#include <cerrno>
+
 namespace {
 
 std::size_t failingSize = 0;
@@ -10,6 +12,7 @@ bool fails(std::size_t size) {
     if (failed || failingSize != size || passesLeft-- > 0) {
         return false;
     }
+    errno = ENOMEM;
     return failed = true;
 }
 

@@ -5,17 +5,22 @@
 
 #include <dlfcn.h>
 #include <fcntl.h>
+#include <sys/file.h>
+#include <sys/mman.h>
 #include <syslog.h>
 #include <unistd.h>
+#include <zanoplatform/error.h>
 #include <zanoplatform/media_database.h>
 #include <zanoplatform/sql_escape.h>
 #include <zanoplatform/strings.h>
+#include <zanoplatform/volumes.h>
 
 #include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstdarg>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <map>
 #include <memory>
@@ -39,6 +44,19 @@ void note(const std::string &line) {
 
 std::string quoted(const char *text) {
     return text != nullptr ? '"' + std::string(text) + '"' : "null";
+}
+
+/* What a child process notes: memory that it shares with this one. */
+constexpr std::size_t kChildNoteSize = 8192;
+char *childNote() {
+    static void *const kShared =
+        mmap(nullptr, kChildNoteSize, PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+    EXPECT_NE(kShared, MAP_FAILED);
+    return static_cast<char *>(kShared);
+}
+
+std::string rowText(const ZANO_MEDIA_INFO *row) {
+    return std::to_string(row->id) + " " + row->title + " " + row->path;
 }
 
 template <typename Function>
@@ -91,8 +109,24 @@ std::string List::text() const {
     return text;
 }
 
+Playlists::~Playlists() {
+    while (head_ != nullptr) {
+        std::free(std::exchange(head_, head_->next));
+    }
+}
+
+std::string Playlists::text() const {
+    std::string text;
+    for (const ZANO_PLAYLIST *node = head_; node != nullptr; node = node->next) {
+        text += std::to_string(node->id) + " " + node->title + " " + node->album + " " +
+                node->path + "\n";
+    }
+    return text;
+}
+
 Test::Test() {
     theScript = Script();
+    *childNote() = '\0';
     theTrace.clear();
 }
 
@@ -136,6 +170,52 @@ int MediaInfoDBGetCount(int table, const char *countExpression, const char *cond
     note("count(" + std::to_string(table) + ", " + quoted(countExpression) + ", " +
          quoted(condition) + ", " + std::to_string(fourth) + ", " + std::to_string(fifth) + ")");
     return theScript.count;
+}
+
+int MediaInfoDBSave(int table, const ZANO_MEDIA_INFO *row) {
+    note("save(" + std::to_string(table) + ", " + rowText(row) + ")");
+    return theScript.saved;
+}
+
+int MediaInfoDBUpdate(int table, const ZANO_MEDIA_INFO *row) {
+    note("update(" + std::to_string(table) + ", " + rowText(row) + ")");
+    return theScript.updated;
+}
+
+int MediaInfoDBDelete(int table, const char *path) {
+    note("delete(" + std::to_string(table) + ", " + quoted(path) + ")");
+    return theScript.deleted;
+}
+
+int KLIBZanoFileIndexAdd(const char *path, const char *formerPath, int operation) {
+    // What a child noted in the meantime.
+    theTrace += childNote();
+    *childNote() = '\0';
+    note("notice(" + quoted(path) + ", " + quoted(formerPath) + ", " + std::to_string(operation) +
+         ")");
+    return theScript.noticed;
+}
+
+int VolumePathParse(const char *path, VOLUME_INFO *volume) {
+    const bool isUsb = std::string_view(path).starts_with("/usb/");
+    volume->type = isUsb ? VOLUME_TYPE_USB : theScript.volumeType;
+    return theScript.volumeResult;
+}
+
+char *KLIBCStrGet(const char *format, ...) {
+    if (theScript.textFails) {
+        return nullptr;
+    }
+    va_list arguments;
+    va_start(arguments, format);
+    char *text = nullptr;
+    EXPECT_NE(vasprintf(&text, format, arguments), -1);
+    va_end(arguments);
+    return text;
+}
+
+int KLIBCErrGet() {
+    return KLIB_ERR_OUT_OF_MEMORY;
 }
 
 int ZANODBEscapeString(char *out, const char *text, int length) {
@@ -204,6 +284,24 @@ void fortifiedSyslog(int priority, int, const char *format, ...) {
     va_start(arguments, format);
     logged(priority, format, arguments);
     va_end(arguments);
+}
+
+EXPORTED int flock(int descriptor, int operation) {
+    if (operation == LOCK_UN && theScript.unlockFails) {
+        errno = EIO;
+        return -1;
+    }
+    return REAL(flock)(descriptor, operation);
+}
+
+EXPORTED int execv(const char *program, char *const argv[]) {
+    std::string line = "exec " + std::string(program);
+    for (; *argv != nullptr; ++argv) {
+        line += " " + quoted(*argv);
+    }
+    line += "\n";
+    childNote()[line.copy(childNote(), kChildNoteSize - 1)] = '\0';
+    _exit(0);
 }
 
 EXPORTED ssize_t readlink(const char *path, char *out, size_t size) {

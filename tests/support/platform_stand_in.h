@@ -1,4 +1,5 @@
-/* Takes the place of the media database, of the music link and of the system log.
+/* Takes the place of the media database, of the music link, of programs started, of volumes and of
+ * the system log.
  *
  * A test program that compiles platform_stand_in.cpp in supplies these functions itself, and the
  * library reaches them over the dynamic symbol table, as it reaches the platform. The escaping
@@ -32,10 +33,19 @@ struct Script {
     bool backslashesFail = false;
     bool templateFails = false;
     bool stringListFails = false;
+    bool textFails = false;  // KLIBCStrGet
+    int saved = 0;           // the answers of MediaInfoDBSave, Update and Delete
+    int updated = 0;
+    int deleted = 0;
+    int volumeResult = 0;  // the answer of VolumePathParse, and the type that it gives all paths
+    int volumeType = 1;    // but those below /usb, which are on a USB volume
+    bool unlockFails = false;
+    int noticed = 0;  // the answer of KLIBZanoFileIndexAdd
 };
 Script &script();
 
-/* The calls since the last one, a line feed behind each. */
+/* The calls since the last one, a line feed behind each. A program that the library starts is not
+ * run; its line is: exec PROGRAM "first" "second". */
 std::string takeTrace();
 
 /* The number of results that were opened and not closed; counts from 0 again after it. */
@@ -60,6 +70,21 @@ class List {
 
   private:
     ZANO_PLAYLIST_REC *head_ = nullptr;
+};
+
+/* The same for playlists; text() is "id title album path", a line for each. */
+class Playlists {
+  public:
+    Playlists() = default;
+    ~Playlists();
+    Playlists(const Playlists &) = delete;
+    Playlists &operator=(const Playlists &) = delete;
+    ZANO_PLAYLIST **address() { return &head_; }
+    ZANO_PLAYLIST *head() { return head_; }
+    std::string text() const;
+
+  private:
+    ZANO_PLAYLIST *head_ = nullptr;
 };
 
 /* Starts from a new script; at the end no result may be open. */
