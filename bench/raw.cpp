@@ -31,7 +31,8 @@ const std::string Raw::kColumns =
     "songs.disc, songs.year, songs.duration, songs.bitrate, songs.frequency";
 
 Raw::Raw(const std::string &path) {
-    check(sqlite3_open_v2(path.c_str(), &database_, SQLITE_OPEN_READONLY, nullptr) == SQLITE_OK,
+    check(sqlite3_open_v2(path.c_str(), &database_, SQLITE_OPEN_READONLY | SQLITE_OPEN_NOMUTEX,
+                          nullptr) == SQLITE_OK,
           database_);
     sqlite3_exec(database_, "PRAGMA cache_size=-16384; PRAGMA mmap_size=4294967296", nullptr,
                  nullptr, nullptr);

@@ -87,6 +87,24 @@ Table tableOf(int kind) {
     }
 }
 
+/* A program asks for the same few orders again and again. */
+void readOrder(const char *text, Query &query) {
+    struct Known {
+        Table table = Table::Songs;
+        std::string text;
+        std::vector<OrderTerm> order;
+        bool random = false;
+    };
+    thread_local Known known;
+    const std::string_view view = text != nullptr ? text : "";
+    if (known.text != view || known.table != query.table) {
+        parseOrder(text, query);
+        known = {query.table, std::string(view), query.order, query.random};
+    }
+    query.order = known.order;
+    query.random = known.random;
+}
+
 struct Held {
     std::shared_ptr<Engine> engine;
     std::unique_ptr<Cursor> cursor;  // ends before its engine
@@ -149,7 +167,7 @@ MEDIA_DB_RESULT *MediaInfoDBOpen(int table, const char *select, const char *cond
         query.select = parseSelect(query.table, select);
         query.condition = parseCondition(query.table, condition);
         query.distinct = parseDistinct(query.table, distinct);
-        parseOrder(orderBy, query);
+        readOrder(orderBy, query);
         query.offset = std::max(offset, 0);
         query.limit = std::max(limit, 0);
         auto held = std::make_unique<Held>();

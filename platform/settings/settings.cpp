@@ -1,6 +1,7 @@
 #include <zanoplatform/settings.h>
+#include <algorithm>
+#include <array>
 #include <fstream>
-#include <iterator>
 #include <string_view>
 
 #include "system_paths_internal.h"
@@ -8,7 +9,7 @@
 namespace {
 
 /* More than any sane settings file; what lies beyond is not read. */
-constexpr std::streamsize kMaxBytes = 1 << 20;
+constexpr size_t kMaxBytes = 1 << 20;
 
 std::string_view trimmed(std::string_view text) {
     constexpr std::string_view kSpaces = " \t\r";
@@ -29,10 +30,13 @@ std::string_view unquoted(std::string_view text) {
 }  // namespace
 
 ZanoConf::ZanoConf() {
+    /* What cannot be read, a folder of that name included, leaves the stream failed and adds
+     * nothing. */
     std::ifstream file(ZANO_PATH_CONF, std::ios::binary);
-    std::istreambuf_iterator<char> in(file);
-    for (std::streamsize n = 0; n < kMaxBytes && in != std::istreambuf_iterator<char>(); ++n) {
-        text_.push_back(*in++);
+    std::array<char, 4096> piece{};
+    while (file && text_.size() < kMaxBytes) {
+        file.read(piece.data(), piece.size());
+        text_.append(piece.data(), static_cast<size_t>(file.gcount()));
     }
 }
 

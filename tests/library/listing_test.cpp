@@ -107,6 +107,7 @@ TEST_F(Listing, FailedOpenIsAnEmptyList) {
     EXPECT_EQ(takeTrace(),
               "open(0, \"*\", \"path like '/volume1/music/%' and  ilike '%x%'\", null, "
               "\"RANDOM()\", 0, 0, 0)\n");
+    EXPECT_EQ(script().backslashSize, 7) << "twice what the quotes may need";
 }
 
 TEST_F(Listing, Failures) {

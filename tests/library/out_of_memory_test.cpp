@@ -18,10 +18,13 @@ const char *const kKeyword = "abcdefghijklmnopqrst";
 class MusicOutOfMemory : public stand_in::Test {};
 
 TEST_F(MusicOutOfMemory, EachAllocationIsReported) {
-    const auto listing = [](ZANO_PLAYLIST_REC **list) {
+    ZANO_PLAYLIST_REC stale{};
+    const auto listing = [&stale](ZANO_PLAYLIST_REC **list) {
+        *list = &stale;
         return ZANOMusicListAll(list, 0, kKeyword, "random", 1, 0, 0);
     };
-    const auto browse = [](ZANO_PLAYLIST_REC **list) {
+    const auto browse = [&stale](ZANO_PLAYLIST_REC **list) {
+        *list = &stale;
         return ZANOMusicBrowse(0, list, nullptr, nullptr, nullptr, nullptr, 0, 0);
     };
     const auto count = [](ZANO_PLAYLIST_REC **) {

@@ -123,6 +123,9 @@ TEST(Settings, LinesWithAndWithoutQuotes) {
     EXPECT_EQ(conf.Info("nothing", "fallback"), "fallback");
     std::filesystem::remove(ZANO_PATH_CONF);
     EXPECT_EQ(ZanoConf().Info("plain", "fallback"), "fallback");
+    std::filesystem::create_directory(ZANO_PATH_CONF);
+    EXPECT_EQ(ZanoConf().Info("plain", "fallback"), "fallback") << "of a folder";
+    std::filesystem::remove(ZANO_PATH_CONF);
 }
 
 }  // namespace

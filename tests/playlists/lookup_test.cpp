@@ -72,6 +72,17 @@ TEST_F(Lookup, CopiesTheWholeRow) {
     EXPECT_EQ(list.head()->next, nullptr);
 }
 
+/* AddressSanitizer's malloc fills what calloc would leave zero. */
+TEST_F(Lookup, NodesAreZeroBeforeTheyAreFilled) {
+    script().rows = {row(5, "five")};
+    script().onlyIdsAreWritten = true;
+    List list;
+    ASSERT_EQ(ZANOMusicListGetByID(list.address(), "5"), 0);
+    ZANO_MEDIA_INFO expected{};
+    expected.id = 5;
+    EXPECT_EQ(bytes(list.head()->info), bytes(expected));
+}
+
 /* Whatever makes lookups quick must place nodes as a plain walk over the fetched list does: the
  * last row first, each node once. */
 TEST_F(Lookup, PlacesNodesAsAPlainWalkDoes) {
@@ -120,6 +131,8 @@ TEST_F(Lookup, BadParameters) {
 TEST_F(Lookup, FailedOpen) {
     script().openFails = true;
     List list;
+    ZANO_PLAYLIST_REC stale{};
+    *list.address() = &stale;
     EXPECT_EQ(ZANOMusicListGetByID(list.address(), "1,'x"), -1);
     EXPECT_EQ(list.head(), nullptr);
     EXPECT_EQ(takeTrace(),

@@ -157,7 +157,12 @@ int MediaInfoDBGet(MEDIA_DB_RESULT *result, ZANO_MEDIA_INFO *row) {
     if (open.nextRow == theScript.rows.size()) {
         return -1;
     }
-    *row = theScript.rows[open.nextRow++];
+    const ZANO_MEDIA_INFO &next = theScript.rows[open.nextRow++];
+    if (theScript.onlyIdsAreWritten) {
+        row->id = next.id;
+    } else {
+        *row = next;
+    }
     return 0;
 }
 
@@ -223,6 +228,7 @@ int ZANODBEscapeString(char *out, const char *text, int length) {
 }
 
 int ZANODBEscapeBackslash(char *out, int size, const char *text) {
+    theScript.backslashSize = size;
     return theScript.backslashesFail ? -1 : REAL(ZANODBEscapeBackslash)(out, size, text);
 }
 

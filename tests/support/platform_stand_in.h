@@ -27,10 +27,12 @@ struct Script {
     int rowCount = 0;  // the fourth field of a result
     int count = 0;     // the answer of MediaInfoDBGetCount
     bool openFails = false;
+    bool onlyIdsAreWritten = false;  // MediaInfoDBGet leaves the rest of a record alone
     std::string musicRoot = "/volume1/music";
     int linkError = 0;  // errno of a music link that cannot be read
     bool quotesFail = false;
     bool backslashesFail = false;
+    int backslashSize = 0;  // kept here: the size that ZANODBEscapeBackslash was given
     bool templateFails = false;
     bool stringListFails = false;
     bool textFails = false;  // KLIBCStrGet

@@ -20,7 +20,9 @@ enum {
     KLIB_ERR_DATABASE_FAILED = 0x1005   /* any other failure of the engine */
 };
 
-/* The code of the last failure in this thread; KLIB_ERR_NONE after a call that succeeded. */
+/* The code of the last failure in this thread. Calls of the media database, the playlist parser,
+ * the volumes and KLIBCStrGet set it, to KLIB_ERR_NONE when they succeed; the lists and the
+ * escaping functions leave it alone. */
 ZANOPLATFORM_API int KLIBCErrGet(void);
 
 /* Its text in English, with the database's own words where it gave any; "" after a success.

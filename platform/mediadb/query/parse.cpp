@@ -13,6 +13,7 @@ constexpr int kMaxDepth = 100;
 /* What one query may cost before its time limit can stop it. */
 constexpr size_t kMaxPatternBytes = 64U << 10;
 constexpr int kMaxPredicates = 500;
+constexpr int kMaxListedTexts = 10000;
 
 constexpr std::array<std::string_view, 2> kFunctions = {"lower", "length"};
 constexpr std::array<std::pair<std::string_view, std::string_view>, 7> kComparisons = {{
@@ -189,6 +190,12 @@ class ConditionParser {
         tokens_.expectSign("(");
         do {
             expression.parts.push_back(literal());
+            const bool isNumber =
+                std::holds_alternative<std::int64_t>(expression.parts.back().value);
+            if (!isNumber && ++listedTexts_ > kMaxListedTexts) {
+                throw QueryError("the query lists more than " + std::to_string(kMaxListedTexts) +
+                                 " texts");
+            }
         } while (tokens_.takeSign(","));
         tokens_.expectSign(")");
     }
@@ -247,6 +254,7 @@ class ConditionParser {
     Tokenizer tokens_;
     int depth_ = 0;
     int predicates_ = 0;
+    int listedTexts_ = 0;
 };
 
 Column takeColumn(Table table, Tokenizer &tokens) {

@@ -20,6 +20,12 @@ void putText(char (&field)[width], std::string_view text) {
     std::memcpy(field, cut.data(), cut.size());
 }
 
+/* A field that its writer filled to the last byte ends there. */
+template <size_t width>
+std::string_view fieldText(const char (&field)[width]) {
+    return {field, strnlen(field, width)};
+}
+
 /* Writes one column of a row into a field of a record that is zero. */
 void putColumn(const Statement &row, int index, Column field, ZANO_MEDIA_INFO &record) {
     switch (field) {
@@ -90,6 +96,7 @@ class BaseCursor : public Cursor {
 
   protected:
     Reader &reader() { return *reader_; }
+    bool isOurs() const { return reader_.isOurs(); }
     const Query &query() const { return query_; }
 
   private:
@@ -105,7 +112,7 @@ class StatementCursor : public BaseCursor {
         : BaseCursor(std::move(lease), std::move(asked)), sql_(dialect()) {}
     /* Before the reader ends its snapshot, which an unfinished statement would keep open. */
     ~StatementCursor() override {
-        if (statement_ != nullptr) {
+        if (statement_ != nullptr && isOurs()) {
             statement_->reset();
         }
     }
@@ -353,7 +360,7 @@ class SqliteEngine : public Engine {
     }
 
     bool updatePlaylist(const ZANO_MEDIA_INFO &row) override {
-        Connection connection = openForWriting(path_);
+        Connection connection = openExistingForWriting(path_);
         Statement update = connection.prepare(
             "UPDATE playlists SET path=?1, title=?2, album=?3, title_key=?4, album_key=?5 "
             "WHERE id=?6");
@@ -363,7 +370,7 @@ class SqliteEngine : public Engine {
     }
 
     bool deletePlaylist(const std::string &path) override {
-        Connection connection = openForWriting(path_);
+        Connection connection = openExistingForWriting(path_);
         connection.prepare("DELETE FROM playlists WHERE path=?1").bind(1, path).run();
         return connection.changes() > 0;
     }
@@ -379,10 +386,12 @@ class SqliteEngine : public Engine {
 
   private:
     static void bindPlaylist(Statement &statement, const ZANO_MEDIA_INFO &row) {
-        const std::string titleKey = foldedKey(row.title);
-        const std::string albumKey = foldedKey(row.album);
-        statement.bind(1, std::string_view(row.path)).bind(2, std::string_view(row.title));
-        statement.bind(3, std::string_view(row.album)).bind(4, titleKey).bind(5, albumKey).run();
+        const std::string_view title = fieldText(row.title);
+        const std::string_view album = fieldText(row.album);
+        const std::string titleKey = foldedKey(title);
+        const std::string albumKey = foldedKey(album);
+        statement.bind(1, fieldText(row.path)).bind(2, title).bind(3, album);
+        statement.bind(4, titleKey).bind(5, albumKey).run();
     }
 
     std::string path_;

@@ -16,10 +16,13 @@ int errorCodeOf(int result) {
             return KLIB_ERR_DATABASE_BUSY;
         case SQLITE_CANTOPEN:
         case SQLITE_NOTADB:
+        case SQLITE_PERM:
+        case SQLITE_READONLY:
             return KLIB_ERR_DATABASE_OPEN;
         case SQLITE_INTERRUPT:
             return KLIB_ERR_DATABASE_TIMEOUT;
         case SQLITE_AUTH:
+        case SQLITE_TOOBIG:
             return KLIB_ERR_DATABASE_QUERY;
         default:
             return KLIB_ERR_DATABASE_FAILED;
@@ -142,7 +145,8 @@ Connection::Connection(const std::string &path, Mode mode) {
     int flags = SQLITE_OPEN_EXRESCODE;
     switch (mode) {
         case Mode::ReadOnly:
-            flags |= SQLITE_OPEN_READONLY;
+            /* Whoever holds a connection for reading has it to himself. */
+            flags |= SQLITE_OPEN_READONLY | SQLITE_OPEN_NOMUTEX;
             break;
         case Mode::ReadWrite:
             flags |= SQLITE_OPEN_READWRITE;

@@ -1,9 +1,12 @@
 #include "reader.h"
 
+#include <pthread.h>
 #include <sys/stat.h>
-#include <unistd.h>
+#include <zanoplatform/error.h>
 
 #include <algorithm>
+#include <atomic>
+#include <new>
 #include <utility>
 
 #include "../engine.h"
@@ -20,29 +23,31 @@ constexpr int kStepsBetweenLooks = 100;
 
 }  // namespace
 
-Reader::Reader(const std::string &path) : connection_(openForReading(path)) {
-    restartClock();
+Reader::Reader(const std::string &path)
+    : connection_(openForReading(path)),
+      snapshot_(connection_.prepare("PRAGMA data_version", true)) {
     sqlite3_progress_handler(connection_.get(), kStepsBetweenLooks, checkClock, this);
 }
 
 int Reader::checkClock(void *self) {
-    return std::chrono::steady_clock::now() > static_cast<Reader *>(self)->deadline_ ? 1 : 0;
+    auto *reader = static_cast<Reader *>(self);
+    const auto now = std::chrono::steady_clock::now();
+    if (!reader->isClockRunning_) {
+        reader->isClockRunning_ = true;
+        reader->deadline_ = now + std::chrono::milliseconds(kQueryLimitMs);
+    }
+    return now > reader->deadline_ ? 1 : 0;
 }
 
-void Reader::restartClock() {
-    deadline_ = std::chrono::steady_clock::now() + std::chrono::milliseconds(kQueryLimitMs);
-}
-
-/* What was read of the state holds as long as nobody has written since. */
+/* A statement that is not reset holds the moment at which it began for all others; that spares the
+ * two of a transaction. What was read of the state holds as long as nobody has written since. */
 void Reader::beginSnapshot() {
     restartClock();
-    statement("BEGIN").run();
-    Using version(statement("PRAGMA data_version"));
-    version->step();
-    if (version->integer(0) != dataVersion_) {
+    snapshot_.step();
+    if (snapshot_.integer(0) != dataVersion_) {
         readState();
         commonPrefix_.reset();
-        dataVersion_ = version->integer(0);
+        dataVersion_ = snapshot_.integer(0);
     }
 }
 
@@ -85,11 +90,7 @@ bool Reader::allPathsBegin(const std::string &prefix) {
 }
 
 void Reader::endSnapshot() noexcept {
-    try {
-        statement("ROLLBACK").run();
-    } catch (const std::exception &) {
-        /* SQLite has ended the transaction already, as it does after some failures. */
-    }
+    snapshot_.reset();
 }
 
 Statement &Reader::statement(const std::string &sql) {
@@ -120,7 +121,7 @@ std::int64_t Reader::integer(const Sql &sql, std::int64_t fallback) {
     return row->step() && !row->isNull(0) ? row->integer(0) : fallback;
 }
 
-ReaderPool::ReaderPool(std::string path) : path_(std::move(path)) {
+ReaderPool::ReaderPool(std::string path) : path_(std::move(path)), forks_(forksSoFar()) {
     idle_.reserve(kMaxIdleReaders);
 }
 
@@ -128,9 +129,19 @@ ReaderPool::~ReaderPool() {
     forgetOthers();
 }
 
+/* Counted by the C library at each fork, since asking for the process costs a system call. */
+unsigned ReaderPool::forksSoFar() {
+    static std::atomic<unsigned> forks{0};
+    static const int registered = pthread_atfork(nullptr, nullptr, [] { ++forks; });
+    if (registered != 0) {
+        throw std::bad_alloc();
+    }
+    return forks;
+}
+
 /* Connections must not be used in a process that was forked off, not even to close them. */
 void ReaderPool::forgetOthers() {
-    if (process_ != 0 && process_ != getpid()) {
+    if (forks_ != forksSoFar()) {
         for (auto &reader : idle_) {
             (void)reader.release();
         }
@@ -143,10 +154,10 @@ ReaderPool::Lease ReaderPool::lease() {
     std::unique_ptr<Reader> reader;
     {
         const std::lock_guard lock(mutex_);
-        if (process_ != getpid()) {
+        if (forks_ != forksSoFar()) {
             forgetOthers();
             idle_.clear();
-            process_ = getpid();
+            forks_ = forksSoFar();
         }
         /* Another file under the same name: a database that was put back from a copy, say. */
         if (!isThere || file.st_dev != device_ || file.st_ino != inode_) {
@@ -162,22 +173,29 @@ ReaderPool::Lease ReaderPool::lease() {
     if (!reader) {
         reader = std::make_unique<Reader>(path_);
     }
-    Lease lease(reader.release(), GiveBack{shared_from_this()});
-    lease->beginSnapshot();
-    return lease;
+    reader->beginSnapshot();
+    return {shared_from_this(), std::move(reader)};
 }
 
-void ReaderPool::GiveBack::operator()(Reader *reader) const noexcept {
-    pool->giveBack(std::unique_ptr<Reader>(reader), getpid());
-}
-
-void ReaderPool::giveBack(std::unique_ptr<Reader> reader, pid_t process) noexcept {
-    const std::lock_guard lock(mutex_);
-    if (process != process_) {
-        (void)reader.release();
-        return;
+Reader &ReaderPool::Lease::operator*() const {
+    if (!isOurs()) {
+        throw DatabaseError(KLIB_ERR_DATABASE_FAILED,
+                            "the result was opened before this process was forked off");
     }
+    return *reader_;
+}
+
+ReaderPool::Lease::~Lease() {
+    if (reader_ != nullptr && isOurs()) {
+        pool_->giveBack(std::move(reader_));
+    } else {
+        (void)reader_.release();
+    }
+}
+
+void ReaderPool::giveBack(std::unique_ptr<Reader> reader) noexcept {
     reader->endSnapshot();
+    const std::lock_guard lock(mutex_);
     if (idle_.size() < kMaxIdleReaders) {
         idle_.push_back(std::move(reader));
     }

@@ -7,6 +7,7 @@
 #pragma once
 
 #include <sys/types.h>
+
 #include <chrono>
 #include <list>
 #include <map>
@@ -14,6 +15,7 @@
 #include <mutex>
 #include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "../query/render.h"
@@ -41,8 +43,9 @@ class Reader {
     /* Whether the path of every song begins so. */
     bool allPathsBegin(const std::string &prefix);
 
-    /* Gives what follows the time limit of a query. */
-    void restartClock();
+    /* Gives what follows the time limit of a query. The clock itself is first looked at when
+     * something takes long enough to be asked for it. */
+    void restartClock() { isClockRunning_ = false; }
 
     /* A prepared statement, kept for the next time; it is the caller's until it is reset. */
     Statement &statement(const std::string &sql);
@@ -55,9 +58,12 @@ class Reader {
   private:
     static int checkClock(void *self);
 
-    Connection connection_;
-    std::chrono::steady_clock::time_point deadline_;
     void readState();
+
+    Connection connection_;
+    bool isClockRunning_ = false;
+    std::chrono::steady_clock::time_point deadline_;
+    Statement snapshot_;
 
     std::int64_t dataVersion_ = -1;
     State state_;
@@ -74,21 +80,39 @@ class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
     ReaderPool &operator=(const ReaderPool &) = delete;
 
     /* A reader with a snapshot begun; it goes back when the lease ends. */
-    struct GiveBack {
-        std::shared_ptr<ReaderPool> pool;
-        void operator()(Reader *reader) const noexcept;
+    class Lease {
+      public:
+        Lease(std::shared_ptr<ReaderPool> pool, std::unique_ptr<Reader> reader)
+            : pool_(std::move(pool)), reader_(std::move(reader)), forks_(forksSoFar()) {}
+        ~Lease();
+        Lease(Lease &&) = default;
+        Lease &operator=(Lease &&) = delete;
+        Lease(const Lease &) = delete;
+        Lease &operator=(const Lease &) = delete;
+
+        /* Throws in a process that was forked off since: the connection is its parent's, and
+         * what it would read there need not be of one moment, nor whole. */
+        Reader &operator*() const;
+        /* false in such a process. */
+        bool isOurs() const { return forks_ == forksSoFar(); }
+
+      private:
+        std::shared_ptr<ReaderPool> pool_;
+        std::unique_ptr<Reader> reader_;
+        unsigned forks_;
     };
-    using Lease = std::unique_ptr<Reader, GiveBack>;
     Lease lease();
 
   private:
+    /* How many forks lie between this process and the one that loaded the library. */
+    static unsigned forksSoFar();
     void forgetOthers();
-    void giveBack(std::unique_ptr<Reader> reader, pid_t process) noexcept;
+    void giveBack(std::unique_ptr<Reader> reader) noexcept;
 
     std::string path_;
     std::mutex mutex_;
     std::vector<std::unique_ptr<Reader>> idle_;
-    pid_t process_ = 0;
+    unsigned forks_ = 0;
     dev_t device_ = 0;
     ino_t inode_ = 0;
 };

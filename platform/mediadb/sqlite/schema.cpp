@@ -3,7 +3,10 @@
 #include <zanoplatform/error.h>
 #include <algorithm>
 #include <array>
+#include <chrono>
 #include <filesystem>
+#include <thread>
+#include <utility>
 
 #include "../catalogue.h"
 #include "grams.h"
@@ -71,7 +74,6 @@ int authorize(void *, int action, const char *first, const char *second, const c
     };
     switch (action) {
         case SQLITE_SELECT:
-        case SQLITE_TRANSACTION:
             return SQLITE_OK;
         case SQLITE_READ:
             return isIn(kReadableTables, first) ? SQLITE_OK : SQLITE_DENY;
@@ -204,18 +206,33 @@ void makeFolderOf(const std::string &path) {
     }
 }
 
-}  // namespace
+/* SQLite gives up at once, without its usual waiting, when two programs change the mode of one
+ * new file. */
+void useWriteAheadLog(Connection &connection) {
+    const auto deadline =
+        std::chrono::steady_clock::now() + std::chrono::milliseconds(kBusyTimeoutMs);
+    for (;;) {
+        try {
+            connection.run("PRAGMA journal_mode=WAL");
+            return;
+        } catch (const DatabaseError &error) {
+            if (error.code() != KLIB_ERR_DATABASE_BUSY ||
+                std::chrono::steady_clock::now() > deadline) {
+                throw;
+            }
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(5));
+    }
+}
 
-Connection openForWriting(const std::string &path) {
-    makeFolderOf(path);
-    Connection connection(path, Connection::Mode::Create);
+Connection prepareForWriting(Connection connection, const std::string &path) {
     prepareForUse(connection);
     namingFile(path, [&] {
         if (!isEmptyFile(connection)) {
             checkVersion(connection, path);
         }
+        useWriteAheadLog(connection);
     });
-    connection.run("PRAGMA journal_mode=WAL");
     connection.run("PRAGMA synchronous=NORMAL");
     connection.run("PRAGMA cache_size=-65536");
     connection.run("PRAGMA temp_store=FILE");
@@ -228,6 +245,17 @@ Connection openForWriting(const std::string &path) {
     sqlite3_file_control(connection.get(), "main", SQLITE_FCNTL_PERSIST_WAL, &keep);
     migrate(connection, path);
     return connection;
+}
+
+}  // namespace
+
+Connection openForWriting(const std::string &path) {
+    makeFolderOf(path);
+    return prepareForWriting(Connection(path, Connection::Mode::Create), path);
+}
+
+Connection openExistingForWriting(const std::string &path) {
+    return prepareForWriting(Connection(path, Connection::Mode::ReadWrite), path);
 }
 
 Connection openForReading(const std::string &path) {

@@ -23,6 +23,9 @@ constexpr int kSchemaVersion = 1;
  * that is not a media database, or is from a newer version, is left as it is and throws. */
 Connection openForWriting(const std::string &path);
 
+/* The same, but a missing file throws and is not made. */
+Connection openExistingForWriting(const std::string &path);
+
 /* Opens for reading and nothing else: only SELECT, on this program's tables, with a short list of
  * functions. Throws as above, and when the file is missing. */
 Connection openForReading(const std::string &path);

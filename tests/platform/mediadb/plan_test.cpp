@@ -28,7 +28,7 @@ class PlanTest : public MediaDatabaseTest {
         Sql sql = SongPlan(*reader, parsed).page("songs.id, songs.title", query);
         Sql explain(dialect());
         explain.add("EXPLAIN QUERY PLAN ").add(sql.text());
-        Statement &rows = reader->statement(explain.text());
+        Statement &rows = (*reader).statement(explain.text());
         int index = 0;
         for (const Value &value : sql.values()) {
             rows.bindValue(++index, value);

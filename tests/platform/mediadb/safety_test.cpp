@@ -1,7 +1,11 @@
 /* Texts come from outside: whatever they are, the database stays as it is. And files that are
  * not what they should be are refused. */
 #include <sqlite3.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <array>
+#include <cstdio>
 #include <cstring>
 #include <sstream>
 
@@ -231,11 +235,87 @@ TEST_F(SafetyTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
 }
 
 /* A reader whose user may not write in the folder, when the writer is long gone. */
+/* Runs an action in a child; its exit status, which the action gives. */
+template <typename Action>
+int statusOfChild(Action action) {
+    const pid_t child = fork();
+    if (child == 0) {
+        _exit(action());
+    }
+    int status = -1;
+    waitpid(child, &status, 0);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+/* As a web front of another user, who may not write in the database's folder. */
 TEST_F(SafetyTest, ADatabaseIsReadableWithoutTheRightToWrite) {
     fill();
-    std::filesystem::permissions(databasePath(), std::filesystem::perms::owner_read);
-    EXPECT_EQ(rows(nullptr, "path").size(), 3U);
     EXPECT_EQ(std::filesystem::file_size(databasePath() + "-wal"), 0U) << "kept, but empty";
+    const auto folder = std::filesystem::path(databasePath()).parent_path();
+    using std::filesystem::perms;
+    for (const char *suffix : {"", "-wal", "-shm"}) {
+        permissions(std::filesystem::path(databasePath() + suffix),
+                    perms::owner_read | perms::group_read | perms::others_read);
+    }
+    permissions(folder, perms(0555));
+    const int found = statusOfChild([&] {
+        constexpr uid_t kNobody = 65534;
+        const bool isOther = geteuid() != 0 || setuid(kNobody) == 0;
+        const bool isRefused = std::ofstream(folder / "new").fail();
+        return isOther && isRefused ? static_cast<int>(rows(nullptr, "path").size()) : 100;
+    });
+    permissions(folder, perms::owner_all);
+    EXPECT_EQ(found, 3);
+}
+
+TEST_F(SafetyTest, AResultEndsWithTheProcessThatOpenedIt) {
+    fill();
+    MEDIA_DB_RESULT *result = MediaInfoDBOpen(0, "*", nullptr, nullptr, "path", 0, 0, 0);
+    ASSERT_NE(result, nullptr);
+    auto record = std::make_unique<ZANO_MEDIA_INFO>();
+    const int inChild = statusOfChild([&] {
+        const bool isRefused =
+            MediaInfoDBGet(result, record.get()) == -1 && KLIBCErrGet() == KLIB_ERR_DATABASE_FAILED;
+        MediaInfoDBClose(result);
+        return isRefused ? static_cast<int>(rows(nullptr, "path").size()) : 100;
+    });
+    EXPECT_EQ(inChild, 3) << "but opens its own";
+    EXPECT_EQ(MediaInfoDBGet(result, record.get()), 0) << "and leaves the parent's alone";
+    MediaInfoDBClose(result);
+}
+
+TEST_F(SafetyTest, ManyMayBeTheFirstToWrite) {
+    std::array<int, 2> gate{};
+    ASSERT_EQ(pipe(gate.data()), 0);
+    std::vector<pid_t> children;
+    for (int i = 0; i < 8; ++i) {
+        children.push_back(fork());
+        if (children.back() == 0) {
+            close(gate[1]);
+            char none = 0;
+            (void)!read(gate[0], &none, 1);
+            ZANO_MEDIA_INFO row{};
+            std::snprintf(row.path, sizeof row.path, "/music/%d.m3u", i);
+            _exit(MediaInfoDBSave(MEDIA_TABLE_PLAYLISTS, &row) == 0 ? 0 : 1);
+        }
+    }
+    close(gate[0]);
+    close(gate[1]);
+    for (const pid_t child : children) {
+        int status = -1;
+        waitpid(child, &status, 0);
+        EXPECT_EQ(status, 0);
+    }
+    EXPECT_EQ(MediaInfoDBGetCount(MEDIA_TABLE_PLAYLISTS, "*", nullptr, 0, 0), 8);
+}
+
+/* Changing what is not there makes no database either. */
+TEST_F(SafetyTest, ChangesOfNothingMakeNoDatabase) {
+    const ZANO_MEDIA_INFO row{};
+    EXPECT_EQ(MediaInfoDBUpdate(MEDIA_TABLE_PLAYLISTS, &row), -1);
+    EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_OPEN);
+    EXPECT_EQ(MediaInfoDBDelete(MEDIA_TABLE_PLAYLISTS, "/music/x.m3u"), -1);
+    EXPECT_FALSE(std::filesystem::exists(databasePath()));
 }
 
 TEST_F(SafetyTest, AResultSeesOneMomentAndBlocksNobody) {
