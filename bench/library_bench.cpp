@@ -11,15 +11,13 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
-#include <filesystem>
-#include <fstream>
 #include <functional>
 #include <random>
 #include <stdexcept>
 
 #include "raw.h"
 #include "report.h"
-#include "system_paths_internal.h"
+#include "root.h"
 
 namespace zano::bench {
 namespace {
@@ -291,15 +289,6 @@ class Questions {
     Raw raw_;
     int songs_ = 0;
 };
-
-void prepareRoot(const std::string &catalogue) {
-    namespace fs = std::filesystem;
-    fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
-    fs::create_directories(fs::path(ZANO_PATH_MUSIC_LINK).parent_path());
-    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"sqlite:" << catalogue << "\"\n";
-    fs::remove(ZANO_PATH_MUSIC_LINK);
-    fs::create_symlink("/volume1/music", ZANO_PATH_MUSIC_LINK);
-}
 
 }  // namespace
 }  // namespace zano::bench

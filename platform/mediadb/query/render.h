@@ -28,7 +28,7 @@ struct Dialect {
 /* A statement being put together: its text and its values. */
 class Sql {
   public:
-    explicit Sql(const Dialect &dialect) : dialect_(&dialect) {}
+    explicit Sql(const Dialect &dialect) : dialect_(&dialect) { text_.reserve(kUsualBytes); }
 
     Sql &add(std::string_view text) {
         text_.append(text);
@@ -52,6 +52,8 @@ class Sql {
     void addLike(const Expression &expression, std::string_view qualifier);
     void addCompare(const Expression &expression, std::string_view qualifier);
     void addIn(const Expression &expression, std::string_view qualifier);
+
+    static constexpr size_t kUsualBytes = 512;
 
     const Dialect *dialect_;
     std::string text_;

@@ -81,6 +81,7 @@ void putRow(const Statement &row, const std::vector<SelectedColumn> &select,
 
 std::string columnList(const std::vector<SelectedColumn> &select, std::string_view qualifier) {
     std::string list;
+    list.reserve(select.size() * 24);
     for (const SelectedColumn &selected : select) {
         list.append(list.empty() ? "" : ", ").append(qualifier);
         list.append(columnInfo(selected.column).name);

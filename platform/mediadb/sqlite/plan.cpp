@@ -261,9 +261,7 @@ std::int64_t SongPlan::estimatedMatches() {
         const auto tokens = gramsOf(term);
         const size_t stride = 1 + tokens.size() / kTokensLookedUp;
         for (size_t i = 0; i < tokens.size(); i += stride) {
-            least = std::min(least, reader_.integer(newSql("SELECT songs FROM gram_counts "
-                                                           "WHERE gram=")
-                                                        .bind(tokens[i])));
+            least = std::min(least, reader_.gramCount(tokens[i]));
         }
         sum += least;
     }

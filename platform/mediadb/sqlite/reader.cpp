@@ -17,6 +17,7 @@ namespace {
 
 constexpr size_t kMaxStatements = 64;
 constexpr size_t kMaxIdleReaders = 4;
+constexpr size_t kMaxGramCounts = 1000;
 /* Steps of SQLite's machine between two looks at the clock: a few rows, since a step may match a
  * pattern with a long text. */
 constexpr int kStepsBetweenLooks = 100;
@@ -47,6 +48,7 @@ void Reader::beginSnapshot() {
     if (snapshot_.integer(0) != dataVersion_) {
         readState();
         commonPrefix_.reset();
+        gramCounts_.clear();
         dataVersion_ = snapshot_.integer(0);
     }
 }
@@ -87,6 +89,21 @@ bool Reader::allPathsBegin(const std::string &prefix) {
         commonPrefix_ = a.substr(0, static_cast<size_t>(end - a.begin()));
     }
     return commonPrefix_->compare(0, prefix.size(), prefix) == 0;
+}
+
+/* A search is asked for page by page, and its count beside each. */
+std::int64_t Reader::gramCount(const std::string &gram) {
+    if (const auto known = gramCounts_.find(gram); known != gramCounts_.end()) {
+        return known->second;
+    }
+    Using row(statement("SELECT songs FROM gram_counts WHERE gram=?"));
+    row->bind(1, gram);
+    const std::int64_t count = row->step() ? row->integer(0) : 0;
+    if (gramCounts_.size() >= kMaxGramCounts) {
+        gramCounts_.clear();
+    }
+    gramCounts_.emplace(gram, count);
+    return count;
 }
 
 void Reader::endSnapshot() noexcept {

@@ -43,6 +43,9 @@ class Reader {
     /* Whether the path of every song begins so. */
     bool allPathsBegin(const std::string &prefix);
 
+    /* How many songs have a token, as counted at the end of a scan; 0 for rare ones. */
+    std::int64_t gramCount(const std::string &gram);
+
     /* Gives what follows the time limit of a query. The clock itself is first looked at when
      * something takes long enough to be asked for it. */
     void restartClock() { isClockRunning_ = false; }
@@ -68,6 +71,7 @@ class Reader {
     std::int64_t dataVersion_ = -1;
     State state_;
     std::optional<std::string> commonPrefix_;                  // of the paths at dataVersion_
+    std::map<std::string, std::int64_t> gramCounts_;           // at dataVersion_
     std::list<std::pair<std::string, Statement>> statements_;  // the last used first
     std::map<std::string_view, std::list<std::pair<std::string, Statement>>::iterator> bySql_;
 };
