@@ -1,5 +1,6 @@
-/* Lists of tracks and of playlists, songs looked up by their ids, and the catalogue of the shared
- * playlists: the files that the media database has rows for.
+/* Lists of tracks and of playlists, songs looked up by their ids, the catalogue of the shared
+ * playlists, which are the files that the media database has rows for, personal playlists, which
+ * are found on disk, and the writing and editing of both.
  *
  * Texts are UTF-8 and end with NUL, paths any bytes but NUL. A size is that of the buffer in bytes,
  * the NUL included: what does not fit is cut, and nothing is written when it is below 1.
@@ -112,6 +113,80 @@ VORELIX_API int ZANOPlayListUnlink(const ZANO_PLAYLIST *list);
  * for its arguments or the missing '.', closes descriptor 0 of the process. */
 VORELIX_API int ZANOWriteMusicPlaylist(const ZANO_PLAYLIST_REC *list, const char *path);
 VORELIX_API int ZANOWriteMusicPlaylistWithMediaList(ZANO_MEDIA_INFO **records, const char *path);
+
+/* Edits of a playlist file: all of it is read (zanoplatform/playlist_parser.h), changed in memory
+ * and written as the writers above do it.
+ *
+ *   id         of a shared playlist, as decimal text
+ *   path       of a personal playlist's file, absolute
+ *   records    a track list; only read, and still the caller's afterwards
+ *   positions  those of the entries in the file, from 0
+ *
+ * 0, or -1 with the file as it was: a null argument, an id that names no playlist, a file that
+ * cannot be read, out of memory. -1 also when the file cannot be written, which may have emptied it
+ * by then. Failures are logged but for a missing array when appending or removing what is missing.
+ *
+ * Reading and writing are two steps, and no lock is held from one to the other: of two edits at
+ * once one may be lost, and an edit fails when it comes to write while another writes. */
+
+/* Removes the entries at the positions of a selection, "0,4,7"; all of them are positions in the
+ * file as it is before the call. What is not the plain decimal number of an entry has no effect. An
+ * empty selection is a success that leaves the file as it is; it is logged.
+ * Only id, path, title and album are read: an m3u file loses the other tags of the entries that are
+ * not in the media database. */
+VORELIX_API int ZANOPlaylistRemoveSongs(const char *id, const char *selection);
+VORELIX_API int ZANOPersonalPlaylistRemoveSongs(const char *path, const char *selection);
+
+/* Replaces `count` entries from position `start` on by records; with count 0 they are inserted in
+ * front of it. Entries are moved by writing a run of them in another order, or by a removal and an
+ * insertion.
+ *
+ * With n records, the new playlist has at most so many entries; what does not fit is left out at
+ * its end: intended and kept.
+ *   n, when that is more than the playlist has entries;
+ *   else entries + n - count, when n is more than count;
+ *   else as many as before.
+ * Nothing is left out when n is no more than the entries and the run lies within them. -1 also,
+ * logged, for a null list of records, for an empty playlist (append to it), and for a start that is
+ * not below that number. A negative start means the first entry, but counts as it is in start +
+ * count; when that is negative, all old entries follow the records. */
+VORELIX_API int ZANOPlaylistUpdateSongs(const char *id, ZANO_PLAYLIST_REC *records, int start,
+                                        int count);
+VORELIX_API int ZANOPersonalPlaylistUpdateSongs(const char *path, ZANO_PLAYLIST_REC *records,
+                                                int start, int count);
+
+/* Writes the first `recordCount` records behind the entries: all of them when it is more than there
+ * are, none when it is negative.
+ * A playlist that cannot be read counts as empty: intended and kept. Its file then holds the
+ * records alone. A caller that must not lose it reads it first. */
+VORELIX_API int ZANOPlaylistAppendSongs(const char *id, ZANO_PLAYLIST_REC *records,
+                                        int recordCount);
+VORELIX_API int ZANOPersonalPlaylistAppendSongs(const char *path, ZANO_PLAYLIST_REC *records,
+                                                int recordCount);
+
+/* Removes every entry that is neither in the media database, nor a web address (http://, in any
+ * case), nor on a USB volume. Whether a file exists is not looked at. An empty playlist is a
+ * failure, as one that cannot be read is. */
+VORELIX_API int ZANOPlaylistRemoveMissing(const char *id);
+VORELIX_API int ZANOPersonalPlaylistRemoveMissing(const char *path);
+
+/* A page of the personal playlists of a directory: the files "*.m3u" in its folder "playlists",
+ * sorted by name as the locale sorts. Names that begin with a dot do not match, nor does "M3U". In
+ * the directory's own path * ? [ and \ are part of the pattern, and all of it is cut to 4095 bytes.
+ *   list    the caller's head; null on entry
+ *   offset  of the first playlist; below 0 counts as 0
+ *   limit   the most that are listed; 0 or less: all
+ * The number of nodes, also 0. A node has its number in the page from 1 as id, the path, and the
+ * file's name without its last extension as title and as album. -1: a null argument (not logged), a
+ * file whose status cannot be read, such as a link to nowhere (not logged either), out of memory.
+ * The nodes made before a failure stay in the list, the last one first: the caller frees the list
+ * in any case. */
+VORELIX_API int ZANOPersonalPlaylistListAll(const char *directory, ZANO_PLAYLIST **list, int offset,
+                                            int limit);
+
+/* The number of personal playlists of a directory, matched as above. -1, not logged: null, out of
+ * memory, or a file whose status cannot be read. */
+VORELIX_API int ZANOPersonalPlaylistTotalGet(const char *directory);
 
 /* Takes the first "/.." out of a path, with the component before it: "/a/b/../c" gives "/a/c". Only
  * the first, and by its letters: "/a/b/..c" gives "/ac". A path without one is copied.
