@@ -21,12 +21,14 @@ mv "$WORK/installed" "$prefix"
 
 mkdir "$WORK/pkg-config"
 export PKG_CONFIG_PATH="$prefix/$LIBDIR/pkgconfig"
-# shellcheck disable=SC2046,SC2086 # lists of words
+# What pkg-config prints is quoted for a shell, so that a folder's name may hold a space.
+eval "set -- $(pkg-config --cflags --libs vorelix)"
+# shellcheck disable=SC2086 # a list of words
 {
     "$CC" -std=c11 $FLAGS "$SOURCE/consumer/list.c" -o "$WORK/pkg-config/list_c" \
-        $(pkg-config --cflags --libs vorelix) "-Wl,-rpath,$prefix/$LIBDIR"
+        "$@" "-Wl,-rpath,$prefix/$LIBDIR"
     "$CXX" -std=c++17 $FLAGS "$SOURCE/consumer/list.cpp" -o "$WORK/pkg-config/list_cpp" \
-        $(pkg-config --cflags --libs vorelix) "-Wl,-rpath,$prefix/$LIBDIR"
+        "$@" "-Wl,-rpath,$prefix/$LIBDIR"
 }
 
 "$CMAKE" -S "$SOURCE/consumer" -B "$WORK/find_package" -DCMAKE_PREFIX_PATH="$prefix" \

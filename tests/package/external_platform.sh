@@ -17,5 +17,8 @@ sh "$SOURCE/exported_names.sh" "$NM" "$SOURCE/exported_names.txt" "$WORK/build/l
 
 "$CMAKE" --install "$WORK/build" --prefix "$WORK/installed" >"$WORK/install.log"
 export PKG_CONFIG_PATH="$WORK/installed/lib/architecture/pkgconfig:$WORK/platform/$LIBDIR/pkgconfig"
-test -f "$(pkg-config --variable=includedir vorelix)/vorelix/vorelix.h"
-test -e "$(pkg-config --variable=libdir vorelix)/libvorelix.so"
+# What pkg-config prints is quoted for a shell.
+eval "includedir=$(pkg-config --variable=includedir vorelix)"
+eval "libdir=$(pkg-config --variable=libdir vorelix)"
+test -f "$includedir/vorelix/vorelix.h"
+test -e "$libdir/libvorelix.so"
