@@ -11,11 +11,14 @@ add_library(vorelix SHARED
     $<TARGET_OBJECTS:vorelix_library>
     $<TARGET_OBJECTS:vorelix_playlists>)
 add_library(vorelix::vorelix ALIAS vorelix)
-# Public, for callers release the lists that they get with a function of the platform.
-target_link_libraries(vorelix PUBLIC vorelix::zanoplatform PRIVATE vorelix_rules)
+# Public, for callers release the lists that they get with a function of the platform, and some
+# hand over JSON values.
+target_link_libraries(vorelix
+    PUBLIC vorelix::zanoplatform JsonCpp::JsonCpp
+    PRIVATE vorelix_rules)
 target_include_directories(vorelix INTERFACE
     $<BUILD_INTERFACE:${PROJECT_BINARY_DIR}/include>
     $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 
 vorelix_package(vorelix "The server side of an audio application on a storage device"
-    "zanoplatform")
+    "zanoplatform;jsoncpp")

@@ -20,7 +20,13 @@ function(vorelix_package name description requires)
 
     set(dependencies "")
     foreach(dependency IN LISTS requires)
-        string(APPEND dependencies "find_dependency(${dependency})\n")
+        if(dependency STREQUAL "jsoncpp")
+            # Its package fails when it is read a second time.
+            string(APPEND dependencies "if(NOT TARGET JsonCpp::JsonCpp)\n")
+            string(APPEND dependencies "    find_dependency(jsoncpp)\nendif()\n")
+        else()
+            string(APPEND dependencies "find_dependency(${dependency})\n")
+        endif()
     endforeach()
     file(CONFIGURE OUTPUT ${PROJECT_BINARY_DIR}/${name}-config.cmake @ONLY CONTENT
 "include(CMakeFindDependencyMacro)
@@ -28,6 +34,7 @@ function(vorelix_package name description requires)
 ")
     write_basic_package_version_file(${PROJECT_BINARY_DIR}/${name}-config-version.cmake
         VERSION ${PROJECT_VERSION} COMPATIBILITY SameMajorVersion)
+    list(JOIN requires " " requires)
     # The prefix is worked out from where the file stands, so an installed tree can be moved. How
     # far up it is depends on the library folder, which may be lib/<architecture>.
     file(RELATIVE_PATH pc_to_prefix

@@ -12,7 +12,12 @@
 
 #define ZANO_PATH_MUSIC_LINK ZANO_ROOT "/var/services/music"
 #define ZANO_PATH_CONF ZANO_ROOT "/usr/zano/etc/zano.conf"
+#define ZANO_PATH_PASSWD ZANO_ROOT "/usr/zano/etc/passwd"
+#define ZANO_PATH_GROUP ZANO_ROOT "/usr/zano/etc/group"
+#define ZANO_PATH_AUDIO_USERS ZANO_ROOT "/usr/zano/etc/audio.users"
 #define ZANO_PATH_MEDIA_DB ZANO_ROOT "/var/lib/zano/media.db"
 #define ZANO_PATH_INDEXER ZANO_ROOT "/usr/zano/bin/zanoindex"
+#define ZANO_PATH_MIME_GENERATOR ZANO_ROOT "/usr/zano/bin/confmimetype"
+#define ZANO_PATH_MIME_MAPPING ZANO_ROOT "/tmp/mimetype.tmp"
 
 #endif

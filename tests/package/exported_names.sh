@@ -15,7 +15,7 @@ status=0
 names "$3" | diff -u "$list" - || status=1
 
 if [ $# -gt 3 ]; then
-    pattern='^((ZANO|KLIB|MediaInfoDB|ParsePlayList|VolumePathParse)[A-Za-z0-9]*$|ZanoConf::)'
+    pattern='^((ZANO|KLIB|MediaInfoDB|ParsePlayList|VolumePathParse)[A-Za-z0-9]*$|(ZanoConf|WebMan|SDK::User)::)'
     if ! names "$4" | grep -qE "$pattern"; then
         echo "$4 exports nothing"
         status=1

@@ -10,9 +10,12 @@ shift 3
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 status=0
+# Headers for C++ may show the JSON values of jsoncpp.
+json=$(pkg-config --cflags jsoncpp)
 
 compiles() { # COMPILER STANDARD LANGUAGE
-    "$1" -std="$2" -x "$3" -I "$include" -Wall -Wextra -Wpedantic -Werror -fsyntax-only \
+    # shellcheck disable=SC2086 # a list of words
+    "$1" -std="$2" -x "$3" -I "$include" $json -Wall -Wextra -Wpedantic -Werror -fsyntax-only \
         "$work/source" >"$work/messages" 2>&1
 }
 
