@@ -9,7 +9,9 @@ endif()
 add_library(vorelix SHARED
     $<TARGET_OBJECTS:vorelix_misc>
     $<TARGET_OBJECTS:vorelix_library>
-    $<TARGET_OBJECTS:vorelix_playlists>)
+    $<TARGET_OBJECTS:vorelix_playlists>
+    $<TARGET_OBJECTS:vorelix_users>
+    $<TARGET_OBJECTS:vorelix_web>)
 add_library(vorelix::vorelix ALIAS vorelix)
 # Public, for callers release the lists that they get with a function of the platform, and some
 # hand over JSON values.

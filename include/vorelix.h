@@ -14,4 +14,9 @@
 #include <vorelix/playlists/playlist.h>
 #include <vorelix/records.h>
 
+#ifdef __cplusplus
+#include <vorelix/users/audiousers.h>
+#include <vorelix/web/actionhandler.h>
+#endif
+
 #endif
