@@ -15,10 +15,11 @@
 namespace zano::playlists {
 namespace {
 
-/* Paths in one query. */
-constexpr std::size_t kBatchPaths = 500;
+/* Paths in one query, and their bytes: nearly every playlist is one batch. */
+constexpr std::size_t kBatchPaths = 40000;
+constexpr std::size_t kBatchBytes = 3U << 20;
 /* Entries whose other readings are in memory at once. */
-constexpr std::size_t kChunkEntries = 5000;
+constexpr std::size_t kChunkEntries = 10000;
 
 constexpr std::array<std::string_view, 13> kColumns = {
     "id",   "path",     "title",   "album",     "artist", "album_artist", "genre",
@@ -211,10 +212,12 @@ void Resolver::findOnDisk(std::span<const Wanted> readings, std::vector<Wanted> 
 
 void Resolver::lookUp(std::span<const Wanted> wanted) {
     std::vector<const Wanted *> batch;
-    for (std::size_t at = 0; at < wanted.size(); at += kBatchPaths) {
+    for (std::size_t at = 0; at < wanted.size();) {
         batch.clear();
-        for (const Wanted &each : wanted.subspan(at, std::min(kBatchPaths, wanted.size() - at))) {
-            batch.push_back(&each);
+        for (std::size_t bytes = 0;
+             at < wanted.size() && batch.size() < kBatchPaths && bytes < kBatchBytes; ++at) {
+            batch.push_back(&wanted[at]);
+            bytes += wanted[at].path.size();
         }
         std::sort(batch.begin(), batch.end(), [](const Wanted *a, const Wanted *b) {
             return std::tie(a->path, a->entry) < std::tie(b->path, b->entry);

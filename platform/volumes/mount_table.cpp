@@ -23,6 +23,9 @@ constexpr auto kNone = std::string_view::npos;
 /* A device of the mapper may stand on another, and that on a third. */
 constexpr int kMaxDepth = 8;
 
+/* A playlist's worth of folders. */
+constexpr std::size_t kMaxFolders = 4096;
+
 constexpr std::array<std::string_view, 16> kNetworkFileSystems = {
     "9p",          "afs",       "ceph",          "cifs",
     "davfs",       "fuse.ceph", "fuse.davfs2",   "fuse.glusterfs",
@@ -110,6 +113,16 @@ std::string parentOf(const std::string &path) {
     return end == kNone ? "/" : path.substr(0, end + 1);
 }
 
+/* Of a path that does not exist, that of the nearest parent that does. */
+std::string nearestRealPath(std::string path) {
+    auto real = realPath(path);
+    while (!real && path != "/") {
+        path = parentOf(path);
+        real = realPath(path);
+    }
+    return real.value_or("/");
+}
+
 bool isLink(const std::string &path) {
     char target = 0;
     return readlink(path.c_str(), &target, 1) != -1;
@@ -142,7 +155,7 @@ bool MountTable::refresh() {
         return true;
     }
     mounts_.clear();
-    lastFolder_ = {};
+    realFolders_.clear();
     const auto text = source_->contents();
     std::string_view rest = text ? *text : std::string_view();
     while (!rest.empty()) {
@@ -171,33 +184,28 @@ void MountTable::addMount(std::string_view line) {
     mount.source = unescaped(takeWord(line));
 }
 
-/* The path without links, from the nearest parent that exists. Whether the folder is the one
- * asked about last, and the file no link, are two looks, where following every step of the path
- * takes one for each. */
+/* The path without links, from the nearest parent that exists. In a folder that is remembered it
+ * takes one look, where following every step of the path takes one for each. */
 std::string MountTable::realPathOf(const std::string &path) {
-    const std::string folder = parentOf(path);
     const bool isPlain = path.back() != '/' && !path.ends_with("/.") && !path.ends_with("/..");
-    if (isPlain && isLastFolder(folder) && !isLink(path)) {
-        return lastFolder_.realPath + path.substr(path.rfind('/'));
+    if (isPlain && !isLink(path)) {
+        return realFolder(parentOf(path)) + path.substr(path.rfind('/'));
     }
-    struct stat at {};
-    auto real = realPath(folder);
-    if (real && stat(folder.c_str(), &at) == 0) {
-        lastFolder_ = {folder, *real == "/" ? "" : *real, at.st_dev, at.st_ino};
-    }
-    std::string existing = path;
-    real = realPath(existing);
-    while (!real && existing != "/") {
-        existing = parentOf(existing);
-        real = realPath(existing);
-    }
-    return real ? *real : "/";
+    return nearestRealPath(path);
 }
 
-bool MountTable::isLastFolder(const std::string &folder) {
-    struct stat at {};
-    return folder == lastFolder_.path && stat(folder.c_str(), &at) == 0 &&
-           at.st_dev == lastFolder_.device && at.st_ino == lastFolder_.inode;
+const std::string &MountTable::realFolder(const std::string &folder) {
+    const auto now = std::chrono::steady_clock::now();
+    if (now >= foldersEnd_ || realFolders_.size() >= kMaxFolders) {
+        realFolders_.clear();
+        foldersEnd_ = now + folderLifetime_;
+    }
+    const auto [known, isNew] = realFolders_.try_emplace(folder);
+    if (isNew) {
+        std::string real = nearestRealPath(folder);
+        known->second = real == "/" ? "" : std::move(real);
+    }
+    return known->second;
 }
 
 MountTable::Mounts::value_type *MountTable::mountAbove(std::string realPath) {

@@ -1,8 +1,7 @@
 /* The mounts of the system, and what each is. */
 #pragma once
 
-#include <sys/types.h>
-
+#include <chrono>
 #include <memory>
 #include <mutex>
 #include <optional>
@@ -39,9 +38,13 @@ std::unique_ptr<MountSource> processMounts();
 /* Any thread. */
 class MountTable {
   public:
-    /* blockDevices: a folder of links MAJOR:MINOR to devices, as /sys/dev/block. */
-    MountTable(std::unique_ptr<MountSource> source, std::string blockDevices)
-        : source_(std::move(source)), blockDevices_(std::move(blockDevices)) {}
+    /* blockDevices: a folder of links MAJOR:MINOR to devices, as /sys/dev/block.
+     * folderLifetime: how long it is remembered where the links of a folder lead. */
+    MountTable(std::unique_ptr<MountSource> source, std::string blockDevices,
+               std::chrono::milliseconds folderLifetime)
+        : source_(std::move(source)),
+          blockDevices_(std::move(blockDevices)),
+          folderLifetime_(folderLifetime) {}
 
     /* The volume that holds an absolute path, or its nearest existing parent; null when the
      * mounts cannot be read. A link leads to the volume that its target is on. */
@@ -56,27 +59,22 @@ class MountTable {
     };
     using Mounts = std::unordered_map<std::string, Mount>;  // by mount point
 
-    /* The folder asked about last: the songs of a playlist lie beside one another. */
-    struct Folder {
-        std::string path;
-        std::string realPath;
-        dev_t device = 0;
-        ino_t inode = 0;
-    };
-
     bool refresh();
     void addMount(std::string_view line);
     std::string realPathOf(const std::string &path);
-    bool isLastFolder(const std::string &folder);
+    const std::string &realFolder(const std::string &folder);
     Mounts::value_type *mountAbove(std::string realPath);
     int typeOf(const Mount &mount) const;
     bool isOnUsb(const std::string &device, int depth) const;
 
     const std::unique_ptr<MountSource> source_;
     const std::string blockDevices_;
+    const std::chrono::milliseconds folderLifetime_;
     std::mutex mutex_;
     Mounts mounts_;
-    Folder lastFolder_;
+    /* The songs of a playlist lie in a few folders. "" for the root. */
+    std::unordered_map<std::string, std::string> realFolders_;
+    std::chrono::steady_clock::time_point foldersEnd_;
 };
 
 }  // namespace zano::volumes

@@ -3,6 +3,7 @@
 #include <zanoplatform/error.h>
 
 #include <algorithm>
+#include <chrono>
 #include <exception>
 
 #include "mount_table.h"
@@ -11,7 +12,10 @@
 namespace {
 
 zano::volumes::MountTable &systemMounts() {
-    static zano::volumes::MountTable mounts(zano::volumes::processMounts(), "/sys/dev/block");
+    /* About as long as writing a playlist takes. */
+    constexpr std::chrono::milliseconds kFolderLifetime(100);
+    static zano::volumes::MountTable mounts(zano::volumes::processMounts(), "/sys/dev/block",
+                                            kFolderLifetime);
     return mounts;
 }
 

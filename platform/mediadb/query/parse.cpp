@@ -13,7 +13,7 @@ constexpr int kMaxDepth = 100;
 /* What one query may cost before its time limit can stop it. */
 constexpr size_t kMaxPatternBytes = 64U << 10;
 constexpr int kMaxPredicates = 500;
-constexpr int kMaxListedTexts = 10000;
+constexpr int kMaxListedTexts = 50000;
 
 constexpr std::array<std::string_view, 2> kFunctions = {"lower", "length"};
 constexpr std::array<std::pair<std::string_view, std::string_view>, 7> kComparisons = {{

@@ -1,12 +1,57 @@
 #include "render.h"
 
 #include <algorithm>
+#include <optional>
+#include <span>
 #include <utility>
 
 #include "text/fold.h"
+#include "text/utf8.h"
 #include "tokens.h"
 
 namespace zano::mediadb {
+
+namespace {
+
+/* False for what JSON has no place for: bytes that are no characters, as paths may have. */
+bool appendJson(std::string &json, const std::string &text) {
+    if (!isUtf8(text)) {
+        return false;
+    }
+    json.push_back('"');
+    for (const char c : text) {
+        if (static_cast<unsigned char>(c) < 0x20) {
+            constexpr std::string_view kDigits = "0123456789abcdef";
+            json.append("\\u00").append(1, kDigits[static_cast<unsigned char>(c) >> 4]);
+            json.push_back(kDigits[c & 0xF]);
+            continue;
+        }
+        json.append(c == '"' || c == '\\' ? "\\" : "").push_back(c);
+    }
+    json.push_back('"');
+    return true;
+}
+
+/* Values of one kind, integers or texts; null when they are not. */
+std::optional<std::string> jsonArray(std::span<const Expression> items) {
+    const size_t kind = items.front().value.index();
+    std::string json;
+    for (const Expression &item : items) {
+        json.push_back(json.empty() ? '[' : ',');
+        const auto *integer = std::get_if<std::int64_t>(&item.value);
+        const auto *text = std::get_if<std::string>(&item.value);
+        if (integer != nullptr) {
+            json.append(std::to_string(*integer));
+        }
+        const bool isWritten = integer != nullptr || (text != nullptr && appendJson(json, *text));
+        if (!isWritten || item.value.index() != kind) {
+            return std::nullopt;
+        }
+    }
+    return json.append("]");
+}
+
+}  // namespace
 
 std::string_view orderColumn(Column column) {
     const ColumnInfo &info = columnInfo(column);
@@ -125,20 +170,15 @@ void Sql::addCompare(const Expression &expression, std::string_view qualifier) {
     add(")");
 }
 
-/* Many numbers are one value, so that statements for lists of any length are one statement. */
+/* Many values are one array, so that statements for lists of any length are one statement. */
 void Sql::addIn(const Expression &expression, std::string_view qualifier) {
     addCondition(expression.parts[0], qualifier);
     const auto items = expression.parts.begin() + 1;
-    const bool areIntegers = std::all_of(items, expression.parts.end(), [](const Expression &item) {
-        return std::holds_alternative<std::int64_t>(item.value);
-    });
-    if (areIntegers && !dialect_->listOfIntegers.empty()) {
-        std::string list;
-        for (auto item = items; item != expression.parts.end(); ++item) {
-            list.append(list.empty() ? "[" : ",");
-            list.append(std::to_string(std::get<std::int64_t>(item->value)));
-        }
-        add(" IN (").add(dialect_->listOfIntegers).add("(").bind(list.append("]")).add("))");
+    auto array = dialect_->listOfValues.empty()
+                     ? std::nullopt
+                     : jsonArray(std::span(items, expression.parts.end()));
+    if (array) {
+        add(" IN (").add(dialect_->listOfValues).add("(").bind(std::move(*array)).add("))");
         return;
     }
     std::string_view separator = " IN (";

@@ -21,8 +21,9 @@ struct Dialect {
     std::string_view length;
     /* A function of text and pattern with the meaning of LIKE; "" for the engine's own LIKE. */
     std::string_view like;
-    /* "SELECT .. FROM function", which gives the rows of "[1,2,3]"; "" where there is none. */
-    std::string_view listOfIntegers;
+    /* "SELECT .. FROM function", which gives the values of a JSON array; "" where there is
+     * none. */
+    std::string_view listOfValues;
 };
 
 /* A statement being put together: its text and its values. */

@@ -3,6 +3,7 @@
 #include <sqlite3.h>
 #include <sys/wait.h>
 #include <unistd.h>
+#include <zanoplatform/sql_escape.h>
 
 #include <array>
 #include <cstdio>
@@ -235,6 +236,26 @@ TEST_F(SafetyTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
 }
 
 /* A reader whose user may not write in the folder, when the writer is long gone. */
+TEST_F(SafetyTest, ListsOfTextsHoldAnyBytes) {
+    const std::vector<std::string> paths = {"/a/\"quoted\"", "/a/back\\slash\\\\", "/a/it's",
+                                            "/a/tab\tand\x01", "/a/\xC3\xA9\xE3\x83\x89"};
+    const std::string notText = "/a/\xFF";
+    auto catalogue = openCatalogue(location());
+    std::vector<Song> songs = {song(notText, "x"), song("/a/other", "x")};
+    std::string list;
+    for (const std::string &path : paths) {
+        songs.push_back(song(path, "x"));
+        std::array<char, 100> quoted{};
+        ZANODBEscapeString(quoted.data(), path.c_str(), static_cast<int>(path.size()));
+        list.append(list.empty() ? "'" : ",'").append(quoted.data()).append("'");
+    }
+    put(*catalogue, songs);
+    EXPECT_EQ(rows(("path in (" + list + ")").c_str(), nullptr), paths);
+    EXPECT_EQ(rows(("path in (" + list + ",'" + notText + "')").c_str(), nullptr).size(), 6U);
+    EXPECT_EQ(rows(("path not in (" + list + ")").c_str(), nullptr).size(), 2U);
+    EXPECT_EQ(rows("title in (1,'x',2.5)", nullptr).size(), 7U) << "of several kinds";
+}
+
 /* Runs an action in a child; its exit status, which the action gives. */
 template <typename Action>
 int statusOfChild(Action action) {

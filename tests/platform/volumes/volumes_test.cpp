@@ -2,6 +2,7 @@
 #include <zanoplatform/error.h>
 #include <zanoplatform/volumes.h>
 
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -91,7 +92,8 @@ class MountTableTest : public testing::Test {
     /* "TYPE MOUNT POINT" below the root. */
     std::string volume(const std::string &path) {
         if (!table_) {
-            table_.emplace(std::make_unique<ScriptedMounts>(script_), at("sys/dev/block"));
+            table_.emplace(std::make_unique<ScriptedMounts>(script_), at("sys/dev/block"),
+                           lifetime_);
         }
         const auto found = table_->volumeOf(path);
         if (!found) {
@@ -104,6 +106,7 @@ class MountTableTest : public testing::Test {
 
     Script script_;
     std::string root_;
+    std::chrono::milliseconds lifetime_{3600000};
 
   private:
     std::optional<MountTable> table_;
@@ -153,6 +156,10 @@ TEST_F(MountTableTest, ANeighbourThatIsALinkOrAMountIsNotTakenForItsFolder) {
     EXPECT_EQ(volume(at("disk/music/x.mp3")), "1 /disk");
     EXPECT_EQ(volume(at("disk/music/b.mp3")), "4 /usb");
     EXPECT_EQ(volume(at("disk/music/a")), "4 /disk/music/a");
+}
+
+TEST_F(MountTableTest, AFolderIsRememberedForItsLifetime) {
+    lifetime_ = {};
     EXPECT_EQ(volume(at("disk/link/x.mp3")), "4 /usb");
     fs::remove(at("disk/link"));
     fs::create_directory_symlink(at("crypt"), at("disk/link"));
