@@ -11,6 +11,7 @@
 #include <unistd.h>
 #include <zanoplatform/error.h>
 #include <zanoplatform/media_database.h>
+#include <zanoplatform/playlist_parser.h>
 #include <zanoplatform/sql_escape.h>
 #include <zanoplatform/strings.h>
 #include <zanoplatform/volumes.h>
@@ -57,6 +58,21 @@ char *childNote() {
 
 std::string rowText(const ZANO_MEDIA_INFO *row) {
     return std::to_string(row->id) + " " + row->title + " " + row->path;
+}
+
+ZANO_PLAYLIST_REC *parsed(const std::string &playlist, int *total, int third, int fourth,
+                          const char *fields, int last) {
+    note("parse(" + playlist + ", " + std::to_string(third) + ", " + std::to_string(fourth) + ", " +
+         quoted(fields) + ", " + std::to_string(last) + ")");
+    ZANO_PLAYLIST_REC *list = nullptr;
+    for (auto entry = theScript.entries.rbegin(); entry != theScript.entries.rend(); ++entry) {
+        auto *const node = static_cast<ZANO_PLAYLIST_REC *>(std::malloc(sizeof(ZANO_PLAYLIST_REC)));
+        node->info = *entry;
+        node->next = list;
+        list = node;
+    }
+    *total = static_cast<int>(theScript.entries.size()) - theScript.missingFromTotal;
+    return list;
 }
 
 template <typename Function>
@@ -201,6 +217,16 @@ int KLIBZanoFileIndexAdd(const char *path, const char *formerPath, int operation
     return theScript.noticed;
 }
 
+ZANO_PLAYLIST_REC *ParsePlayListByField(const char *id, int *total, int third, int fourth,
+                                        const char *fields, int last) {
+    return parsed("id " + quoted(id), total, third, fourth, fields, last);
+}
+
+ZANO_PLAYLIST_REC *ParsePlayListByFieldGivenPath(const char *path, int *total, int third,
+                                                 int fourth, const char *fields, int last) {
+    return parsed(quoted(path), total, third, fourth, fields, last);
+}
+
 int VolumePathParse(const char *path, VOLUME_INFO *volume) {
     const bool isUsb = std::string_view(path).starts_with("/usb/");
     volume->type = isUsb ? VOLUME_TYPE_USB : theScript.volumeType;
@@ -259,6 +285,15 @@ PSZLIST KLIBCSzListAlloc(int capacity) {
         note("a string list for " + std::to_string(capacity));
     }
     return theScript.stringListFails ? nullptr : REAL(KLIBCSzListAlloc)(capacity);
+}
+
+int KLIBCStrSep(const char *text, const char *separator, PSZLIST *list) {
+    return theScript.splitFails ? -1 : REAL(KLIBCStrSep)(text, separator, list);
+}
+
+void KLIBCSzListSortItems(PSZLIST list, int keepSorted) {
+    note("sort(" + std::to_string(list->count) + " items, " + std::to_string(keepSorted) + ")");
+    REAL(KLIBCSzListSortItems)(list, keepSorted);
 }
 
 // The system's functions by their names in the C library, also as fortified builds call them.

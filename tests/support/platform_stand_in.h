@@ -1,5 +1,5 @@
-/* Takes the place of the media database, of the music link, of programs started, of volumes and of
- * the system log.
+/* Takes the place of the media database, of the playlist parser, of the music link, of programs
+ * started, of volumes and of the system log.
  *
  * A test program that compiles platform_stand_in.cpp in supplies these functions itself, and the
  * library reaches them over the dynamic symbol table, as it reaches the platform. The escaping
@@ -35,14 +35,17 @@ struct Script {
     int backslashSize = 0;  // kept here: the size that ZANODBEscapeBackslash was given
     bool templateFails = false;
     bool stringListFails = false;
-    bool textFails = false;  // KLIBCStrGet
-    int saved = 0;           // the answers of MediaInfoDBSave, Update and Delete
+    bool splitFails = false;  // KLIBCStrSep
+    bool textFails = false;   // KLIBCStrGet
+    int saved = 0;            // the answers of MediaInfoDBSave, Update and Delete
     int updated = 0;
     int deleted = 0;
     int volumeResult = 0;  // the answer of VolumePathParse, and the type that it gives all paths
     int volumeType = 1;    // but those below /usb, which are on a USB volume
     bool unlockFails = false;
-    int noticed = 0;  // the answer of KLIBZanoFileIndexAdd
+    int noticed = 0;                       // the answer of KLIBZanoFileIndexAdd
+    std::vector<ZANO_MEDIA_INFO> entries;  // of every playlist; without any the parser gives null
+    int missingFromTotal = 0;              // how many of them the parser does not count
 };
 Script &script();
 

@@ -1,0 +1,394 @@
+#include <unistd.h>
+#include <vorelix/playlists/playlist.h>
+
+#include <climits>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <iterator>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "support/failing_allocator.h"
+#include "support/platform_stand_in.h"
+
+namespace {
+
+using stand_in::script;
+using stand_in::takeTrace;
+
+/* The edits of shared playlists by id, and of personal ones by path. */
+struct Family {
+    bool isShared;
+    int (*removeSongs)(const char *playlist, const char *selection);
+    int (*updateSongs)(const char *playlist, ZANO_PLAYLIST_REC *records, int start, int count);
+    int (*appendSongs)(const char *playlist, ZANO_PLAYLIST_REC *records, int recordCount);
+    int (*removeMissing)(const char *playlist);
+};
+constexpr Family kFamilies[] = {
+    {true, ZANOPlaylistRemoveSongs, ZANOPlaylistUpdateSongs, ZANOPlaylistAppendSongs,
+     ZANOPlaylistRemoveMissing},
+    {false, ZANOPersonalPlaylistRemoveSongs, ZANOPersonalPlaylistUpdateSongs,
+     ZANOPersonalPlaylistAppendSongs, ZANOPersonalPlaylistRemoveMissing},
+};
+
+/* Each name is a song beside the playlist; names are parted by blanks. */
+class Edit : public stand_in::Test, public testing::WithParamInterface<Family> {
+  protected:
+    Edit() : folder(mkdtemp((testing::TempDir() + "edit_XXXXXX").data())), file(folder + "/l.m3u") {
+        script().rows = {stand_in::row(12, "")};
+        file.copy(script().rows[0].path, file.size());
+        script().rows[0].path[file.size()] = '\0';
+    }
+    ~Edit() override { std::filesystem::remove_all(folder); }
+
+    std::vector<ZANO_MEDIA_INFO> songs(const std::string &names) const {
+        std::vector<ZANO_MEDIA_INFO> made;
+        std::istringstream words(names);
+        for (std::string name; words >> name;) {
+            made.push_back(stand_in::row(1, ""));
+            name.insert(0, folder + "/").copy(made.back().path, sizeof made.back().path - 1);
+        }
+        return made;
+    }
+
+    void given(const std::string &names) const {
+        script().entries = songs(names);
+        std::ofstream(file) << "before";
+    }
+
+    std::string contents() const {
+        std::ifstream stream(file, std::ios::binary);
+        std::string text{std::istreambuf_iterator<char>(stream), {}};
+        if (text.rfind("#EXTM3U\r\n", 0) == 0) {
+            text.erase(0, 9);
+        }
+        for (auto end = text.find("\r\n"); end != std::string::npos; end = text.find("\r\n")) {
+            text.replace(end, 2, end + 2 == text.size() ? "" : " ");
+        }
+        return text;
+    }
+
+    const char *playlist() const { return GetParam().isShared ? "12" : file.c_str(); }
+
+    int update(const std::string &names, int start, int count) const {
+        return withRecords(names, [&](ZANO_PLAYLIST_REC *records) {
+            return GetParam().updateSongs(playlist(), records, start, count);
+        });
+    }
+    int append(const std::string &names, int count) const {
+        return withRecords(names, [&](ZANO_PLAYLIST_REC *records) {
+            return GetParam().appendSongs(playlist(), records, count);
+        });
+    }
+
+    /* What an edit asks for before it changes anything. */
+    static std::string looked() {
+        return GetParam().isShared ? "open(3, \"path\", \"id = 12\", null, null, 0, 0, 0)\nclose\n"
+                                   : "";
+    }
+    std::string parsed(const std::string &fields) const {
+        return "parse(" + (GetParam().isShared ? "id \"12\"" : "\"" + file + "\"") + ", 0, 0, \"" +
+               fields + "\", 1)\n";
+    }
+    static std::string line(const std::string &shared, const std::string &personal,
+                            const std::string &text) {
+        return "3 playlist.cpp" + (GetParam().isShared ? shared : personal) + " " + text + "\n";
+    }
+
+    std::string folder;
+    std::string file;
+
+  private:
+    int withRecords(const std::string &names,
+                    const std::function<int(ZANO_PLAYLIST_REC *)> &edit) const {
+        std::vector<ZANO_PLAYLIST_REC> nodes;
+        for (const ZANO_MEDIA_INFO &song : songs(names)) {
+            nodes.push_back({song, {nullptr}});
+        }
+        for (std::size_t index = 1; index < nodes.size(); ++index) {
+            nodes[index - 1].next = &nodes[index];
+        }
+        return edit(nodes.empty() ? nullptr : nodes.data());
+    }
+};
+
+INSTANTIATE_TEST_SUITE_P(, Edit, testing::ValuesIn(kFamilies),
+                         [](const auto &family) -> std::string {
+                             return family.param.isShared ? "Shared" : "Personal";
+                         });
+
+const std::string kSorted = "sort(0 items, 1)\n";
+
+TEST_P(Edit, RemovesPositionsOfTheFileAsItWas) {
+    const struct {
+        const char *entries;
+        const char *selection;
+        const char *left;
+    } cases[] = {
+        {"a b c", "1", "a c"},
+        {"a b c", "0,0,9", "b c"},
+        {"a b c", "2,1,0", ""},
+        {"a b c", " 1,01,+1,1x,,-1,4294967297", "a b c"},
+        {"a b c d e f g h i j k", "10,2,0", "b d e f g h i j"},
+    };
+    for (const auto &each : cases) {
+        given(each.entries);
+        EXPECT_EQ(GetParam().removeSongs(playlist(), each.selection), 0) << each.selection;
+        EXPECT_EQ(contents(), each.left) << each.selection;
+        EXPECT_EQ(takeTrace(), looked() + kSorted + parsed("id, path, title, album"));
+    }
+}
+
+TEST_P(Edit, AnEmptySelectionIsASuccess) {
+    given("a b");
+    EXPECT_EQ(GetParam().removeSongs(playlist(), ""), 0);
+    EXPECT_EQ(contents(), "before");
+    EXPECT_EQ(takeTrace(),
+              looked() + kSorted + line(" (999)", " (1518)", "There is no selected item."));
+}
+
+TEST_P(Edit, ReplacesARun) {
+    const struct {
+        const char *entries;
+        const char *records;
+        int start;
+        int count;
+        const char *expected;
+    } cases[] = {
+        {"a b c", "x", 1, 0, "a x b c"},
+        {"a b c", "x", 1, 1, "a x c"},
+        {"a b c", "x y", 1, 1, "a x y c"},
+        {"a b c", "x", 0, 2, "x c"},
+        {"a b c", "x y z", 0, 3, "x y z"},
+        {"a b c", "x", 3, 0, "a b c x"},
+        {"a b c", "x", 1, INT_MAX, "a x"},
+        // A size that is too small for all of it.
+        {"a b c", "x y", 3, 1, "a b c x"},
+        {"a b", "x y z", 1, 0, "a x y"},
+        {"a", "x y z", 0, 0, "x y z"},
+        // Starts and counts below 0.
+        {"a b c", "x", -1, 0, "x a b c"},
+        {"a b c", "x", -1, 2, "x b c"},
+        {"a b c", "x", -2, 1, "x a b"},
+        {"a b c", "x", INT_MIN, -1, "x a b c"},
+        {"a b c", "x", 2, -2, "a b x a b c"},
+    };
+    for (const auto &each : cases) {
+        const std::string what = std::string(each.entries) + " | " + each.records + " " +
+                                 std::to_string(each.start) + " " + std::to_string(each.count);
+        given(each.entries);
+        EXPECT_EQ(update(each.records, each.start, each.count), 0) << what;
+        EXPECT_EQ(contents(), each.expected) << what;
+        EXPECT_EQ(takeTrace(), looked() + parsed("*")) << what;
+    }
+}
+
+TEST_P(Edit, StartsBehindTheEnd) {
+    const struct {
+        int start;
+        int count;
+        const char *line;
+    } cases[] = {
+        {3, 1, "Bad parameters. Start[3] > TotalRow[3]"},
+        {4, 0, "Bad parameters. Start[4] > TotalRow[4]"},
+        {INT_MAX, 0, "Bad parameters. Start[2147483647] > TotalRow[4]"},
+    };
+    given("a b c");
+    for (const auto &each : cases) {
+        EXPECT_EQ(update("x", each.start, each.count), -1) << each.line;
+        EXPECT_EQ(takeTrace(), looked() + parsed("*") + line(":1096", ":1687", each.line));
+        EXPECT_EQ(contents(), "before") << each.line;
+    }
+}
+
+TEST_P(Edit, AppendsAsManyAsCounted) {
+    const struct {
+        const char *entries;
+        int count;
+        const char *expected;
+    } cases[] = {
+        {"a b", 2, "a b x y"},   {"a b", 1, "a b x"},   {"a b", 0, "a b"}, {"a b", -7, "a b"},
+        {"a b", INT_MIN, "a b"}, {"a b", 9, "a b x y"}, {"", 2, "x y"},
+    };
+    for (const auto &each : cases) {
+        given(each.entries);
+        EXPECT_EQ(append("x y", each.count), 0) << each.entries << each.count;
+        EXPECT_EQ(contents(), each.expected) << each.entries << each.count;
+        EXPECT_EQ(takeTrace(), looked() + parsed("*"));
+    }
+}
+
+TEST_P(Edit, KeepsTracksAddressesAndUsb) {
+    script().entries = songs("kept gone");
+    script().entries[1].id = 0;
+    for (const char *path : {"HTTP://host/x", "https://host/x", "/usb/a.mp3", "http:/a", ""}) {
+        script().entries.push_back({});
+        std::string(path).copy(script().entries.back().path, 100);
+    }
+    std::ofstream(file) << "before";
+    EXPECT_EQ(GetParam().removeMissing(playlist()), 0);
+    EXPECT_EQ(contents(), "kept HTTP://host/x /usb/a.mp3");
+    EXPECT_EQ(takeTrace(), looked() + parsed("*"));
+
+    script().entries.resize(2);
+    script().entries.erase(script().entries.begin());
+    EXPECT_EQ(GetParam().removeMissing(playlist()), 0);
+    EXPECT_EQ(contents(), "");
+}
+
+/* Although the parser gives more entries than it counts. */
+TEST_P(Edit, NothingIsWrittenBehindTheArray) {
+    script().missingFromTotal = 2;
+    for (const auto &[edit, expected] :
+         {std::pair<std::function<int()>, const char *>{[&] { return append("x", 1); }, "a b"},
+          {[&] { return update("x", 0, 0); }, "x a"},
+          {[&] { return GetParam().removeMissing(playlist()); }, "a"}}) {
+        given("a b c");
+        EXPECT_EQ(edit(), 0) << expected;
+        EXPECT_EQ(contents(), expected);
+    }
+    takeTrace();
+    script().missingFromTotal = 4;
+    EXPECT_EQ(update("x", 0, 0), -1);
+    EXPECT_EQ(takeTrace(),
+              looked() + parsed("*") + line(":1077", ":1668", "Failed to parse playlist."));
+}
+
+TEST_P(Edit, PlaylistsThatCannotBeRead) {
+    given("");
+    const std::string shown = GetParam().isShared ? " (12, " + file + ")" : ": " + file;
+    const struct {
+        std::function<int()> edit;
+        std::string trace;
+    } cases[] = {
+        {[&] { return GetParam().removeSongs(playlist(), "0"); },
+         kSorted + parsed("id, path, title, album") +
+             line(" (1006)", " (1525)", "pMusicRec is null.")},
+        {[&] { return update("x", 0, 0); },
+         parsed("*") + line(":1077", ":1668", "Failed to parse playlist.")},
+        {[&] { return GetParam().removeMissing(playlist()); },
+         parsed("*") + line(":1271", ":1598", "Parse playlist" + shown + " return NULL.")},
+    };
+    for (const auto &each : cases) {
+        EXPECT_EQ(each.edit(), -1) << each.trace;
+        EXPECT_EQ(takeTrace(), looked() + each.trace);
+        EXPECT_EQ(contents(), "before");
+    }
+}
+
+TEST_P(Edit, FilesThatCannotBeWritten) {
+    given("a b c");
+    std::filesystem::remove(file);
+    std::filesystem::create_directory(file);
+    const std::string notUpdated = "Failed to update playlist.(" + file + ")";
+    const struct {
+        std::function<int()> edit;
+        std::string writer;
+        std::string line;
+    } cases[] = {
+        {[&] { return GetParam().removeSongs(playlist(), "0"); }, "(732)",
+         line(" (1042)", " (1561)", notUpdated)},
+        {[&] { return update("x", 0, 0); }, "(861)", line(" (1138)", " (1729)", notUpdated)},
+        {[&] { return append("x", 1); }, "(861)", line(" (1199)", " (1471)", notUpdated)},
+        {[&] { return GetParam().removeMissing(playlist()); }, "(861)",
+         line(":1296", ":1623", "Failed to write playlist.(" + file + ")")},
+    };
+    for (const auto &each : cases) {
+        EXPECT_EQ(each.edit(), -1) << each.line;
+        const std::string opened =
+            "3 playlist.cpp" + each.writer + ": Failed to open " + file + ".\n";
+        const std::string trace = takeTrace();
+        EXPECT_EQ(trace.substr(trace.find("3 play")), opened + each.line);
+    }
+}
+
+TEST_P(Edit, OutOfMemory) {
+    given("a b c");
+    const std::string noList = kSorted + line(" (992)", " (1511)", "Failed to malloc list.");
+    script().splitFails = true;
+    EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
+    EXPECT_EQ(takeTrace(), looked() + noList);
+    script().stringListFails = true;
+    EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
+    EXPECT_EQ(takeTrace(), looked() + noList.substr(kSorted.size()));
+
+    const struct {
+        std::function<int()> edit;
+        std::size_t pointers;
+        std::string line;
+    } cases[] = {
+        {[&] { return update("x", 9, 0); }, 5, line(":1090", ":1681", "Failed to calloc()")},
+        {[&] { return append("x", 4); }, 8, ""},
+        {[&] { return GetParam().removeMissing(playlist()); }, 4, ""},
+    };
+    for (const auto &each : cases) {
+        failing_allocator::failOnSize(each.pointers * sizeof(void *));
+        EXPECT_EQ(each.edit(), -1) << each.pointers;
+        EXPECT_TRUE(failing_allocator::hasFailed()) << each.pointers;
+        EXPECT_EQ(takeTrace(), looked() + parsed("*") + each.line);
+        EXPECT_EQ(contents(), "before");
+    }
+}
+
+TEST_P(Edit, BadParameters) {
+    ZANO_PLAYLIST_REC record{};
+    const struct {
+        int result;
+        std::string line;
+    } cases[] = {
+        {GetParam().removeSongs(nullptr, "0"), line(" (979)", " (1505)", "Bad parameter.")},
+        {GetParam().removeSongs(playlist(), nullptr), line(" (979)", " (1505)", "Bad parameter.")},
+        {GetParam().updateSongs(nullptr, &record, 0, 0),
+         line(" (1065)", " (1661)", "Bad parameter.")},
+        {update("", 0, 0), line(" (1065)", " (1661)", "Bad parameter.")},
+        {GetParam().appendSongs(nullptr, &record, 1), line(" (1161)", " (1438)", "Bad parameter.")},
+        {append("", 0), line(" (1161)", " (1438)", "Bad parameter.")},
+        {GetParam().removeMissing(nullptr), line(":1258", ":1592", "Bad parameter.")},
+    };
+    std::string lines;
+    for (const auto &each : cases) {
+        EXPECT_EQ(each.result, -1) << each.line;
+        lines += each.line;
+    }
+    EXPECT_EQ(takeTrace(), lines);
+}
+
+class SharedPlaylist : public Edit {};
+INSTANTIATE_TEST_SUITE_P(, SharedPlaylist, testing::Values(kFamilies[0]));
+
+/* The removals ask for the file whatever the lookup gave, the others for what it gave. */
+TEST_P(SharedPlaylist, IdsWithoutAFile) {
+    const struct {
+        std::function<int(const char *id)> edit;
+        std::string withoutRow;
+        std::string withoutFile;
+    } cases[] = {
+        {[](const char *id) { return ZANOPlaylistRemoveSongs(id, "0"); },
+         " (986) Playlist(12, ) does not exist.\n",
+         " (986) Playlist(12, " + file + ") does not exist.\n"},
+        {ZANOPlaylistRemoveMissing, ":1265 Playlist(12, ) does not exist.\n",
+         ":1265 Playlist(12, " + file + ") does not exist.\n"},
+        {[this](const char *) { return update("x", 0, 0); },
+         " (1070) Failed to get playlist path.\n", ""},
+        {[this](const char *) { return append("x", 1); }, " (1166) Failed to get playlist path.\n",
+         ""},
+    };
+    for (const auto &each : cases) {
+        const auto rows = script().rows;
+        script().rows.clear();
+        EXPECT_EQ(each.edit("12"), -1) << each.withoutRow;
+        EXPECT_EQ(takeTrace(), looked() + "3 playlist.cpp" + each.withoutRow);
+        script().rows = rows;
+        script().entries = songs("a");
+        std::filesystem::remove(file);
+        EXPECT_EQ(each.edit("12"), each.withoutFile.empty() ? 0 : -1);
+        EXPECT_EQ(takeTrace(),
+                  looked() + (each.withoutFile.empty() ? parsed("*")
+                                                       : "3 playlist.cpp" + each.withoutFile));
+    }
+}
+
+}  // namespace
