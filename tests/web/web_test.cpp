@@ -1,0 +1,80 @@
+#include <gtest/gtest.h>
+
+#include <array>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <string>
+
+#include "system_paths_internal.h"
+
+namespace {
+
+constexpr const char *kRest = "\r\nX-Content-Type-Options: nosniff\r\n\r\n";
+constexpr const char *kJsonHeader =
+    "Content-Type: application/json; charset=\"UTF-8\"\r\nCache-Control: no-store";
+
+/* What the program writes, with the end of its action object in front. */
+std::string answerOf(const std::string &action) {
+    const std::string program = ANSWER;
+    const std::string command =
+        "'" + program + "' " + action + " 2>&1 >'" + program + ".out'; cat '" + program + ".out'";
+    std::FILE *const output = popen(command.c_str(), "r");
+    std::string text;
+    std::array<char, 4096> part{};
+    for (size_t size = 1; size > 0;) {
+        size = std::fread(part.data(), 1, part.size(), output);
+        text.append(part.data(), size);
+    }
+    EXPECT_EQ(pclose(output), 0) << action;
+    return text;
+}
+
+class Answers : public testing::Test {
+  protected:
+    Answers() {
+        std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
+        setUp("runvorelix=\"yes\"\n");
+    }
+    ~Answers() override { std::filesystem::remove(ZANO_PATH_CONF); }
+    static void setUp(const char *settings) { std::ofstream(ZANO_PATH_CONF) << settings; }
+};
+
+TEST_F(Answers, OfAServiceThatIsOffAreOneRefusal) {
+    const std::string refusal =
+        "~Action\nContent-Type: text/plain; charset=\"UTF-8\"\r\nCache-Control: no-store" +
+        std::string(kRest) + "{\"success\":false}";
+    for (const char *settings : {"", "runvorelix=\"no\"", "runvorelix=\"\"", "runvorelix=\"1\"",
+                                 "runvorelix=\"yes!\"", "other=\"yes\""}) {
+        setUp(settings);
+        EXPECT_EQ(answerOf("list"), refusal) << settings;
+    }
+    std::filesystem::remove(ZANO_PATH_CONF);
+    EXPECT_EQ(answerOf("list"), refusal);
+    for (const char *settings : {"runvorelix=\"YES\"", "runvorelix=Yes", "runvorelix=\"yEs\""}) {
+        setUp(settings);
+        EXPECT_EQ(answerOf("only_error").substr(8, 23), "Content-Type: applicati") << settings;
+    }
+}
+
+TEST_F(Answers, AreTheEnvelopeWithItsHeader) {
+    const std::pair<const char *, const char *> cases[] = {
+        {"list",
+         "{\"songs\":[\"Caf\xC3\xA9 <b>\\\"\\u0001\",\"bad \xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD"
+         "\\\" end\"],\"success\":true,\"total\":2}"},
+        {"fail",
+         "{\"errno\":{\"key\":\"id\",\"line\":120,\"more\":true,\"section\":\"playlist\"},"
+         "\"success\":false}"},
+        {"only_error", "{\"errno\":{\"key\":\"id\",\"line\":-1,\"section\":\"playlist\"}}"},
+        {"other_shape",
+         "{\"errno\":{\"key\":\"b\",\"line\":3,\"section\":\"a\"},\"success\":false}"},
+        {"text", "{\"errno\":{\"key\":\"b\",\"line\":3,\"section\":\"a\"}}"},
+    };
+    for (const auto &[action, body] : cases) {
+        EXPECT_EQ(answerOf(action), std::string("~Action\n") + kJsonHeader + kRest + body);
+    }
+    EXPECT_EQ(answerOf("cached"),
+              std::string("Content-Type: text/plain\r\nCache-Control: private") + kRest + "null");
+}
+
+}  // namespace
