@@ -66,9 +66,9 @@ TEST_F(Personal, PagesOfMatchesByName) {
     };
     for (const auto &each : cases) {
         Playlists list;
-        EXPECT_EQ(
-            ZANOPersonalPlaylistListAll(folder.c_str(), list.address(), each.offset, each.limit),
-            static_cast<int>(ZANOPlaylistCount(list.head())));
+        const int count =
+            ZANOPersonalPlaylistListAll(folder.c_str(), list.address(), each.offset, each.limit);
+        EXPECT_EQ(count, static_cast<int>(ZANOPlaylistCount(list.head())));
         EXPECT_EQ(list.text(), each.expected) << each.offset << " " << each.limit;
     }
     EXPECT_EQ(ZANOPersonalPlaylistTotalGet(folder.c_str()), 3);
