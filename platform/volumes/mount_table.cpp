@@ -25,6 +25,8 @@ constexpr int kMaxDepth = 8;
 
 /* A playlist's worth of folders. */
 constexpr std::size_t kMaxFolders = 4096;
+/* So many looks at files cost about what a look at their folder does. */
+constexpr int kManyFiles = 16;
 
 constexpr std::array<std::string_view, 16> kNetworkFileSystems = {
     "9p",          "afs",       "ceph",          "cifs",
@@ -128,6 +130,21 @@ bool isLink(const std::string &path) {
     return readlink(path.c_str(), &target, 1) != -1;
 }
 
+/* The names of the links in a folder. */
+std::unordered_set<std::string> linksIn(const std::string &folder) {
+    namespace fs = std::filesystem;
+    std::unordered_set<std::string> names;
+    std::error_code failed;  // there are none in a folder that is not there
+    for (fs::directory_iterator at(folder, failed), end; !failed && at != end;
+         at.increment(failed)) {
+        std::error_code unknown;
+        if (at->is_symlink(unknown)) {
+            names.insert(at->path().filename().string());
+        }
+    }
+    return names;
+}
+
 }  // namespace
 
 std::unique_ptr<MountSource> processMounts() {
@@ -139,7 +156,8 @@ std::optional<Volume> MountTable::volumeOf(const std::string &path) {
     if (!refresh()) {
         return std::nullopt;
     }
-    auto *found = mountAbove(realPathOf(path));
+    Mounts::value_type *found =
+        isPlain(path) ? mountOfPlain(path) : mountAbove(nearestRealPath(path));
     if (found == nullptr) {
         return std::nullopt;
     }
@@ -150,12 +168,59 @@ std::optional<Volume> MountTable::volumeOf(const std::string &path) {
     return Volume{mountPoint, mount.type};
 }
 
+/* "/." and the like name another folder than the one that they stand in. */
+bool MountTable::isPlain(std::string_view path) {
+    return path.back() != '/' && !path.ends_with("/.") && !path.ends_with("/..");
+}
+
+MountTable::Mounts::value_type *MountTable::mountOfPlain(const std::string &path) {
+    const std::size_t slash = path.rfind('/');
+    const std::string name = path.substr(slash + 1);
+    Folder &folder = folderOf(path.substr(0, slash));
+    if (isLinkIn(folder, path, name)) {
+        return mountAbove(nearestRealPath(path));
+    }
+    if (!folder.isThere) {
+        return folder.mount;
+    }
+    const auto onItself = mounts_.find(folder.realPath + "/" + name);
+    return onItself != mounts_.end() ? &*onItself : folder.mount;
+}
+
+MountTable::Folder &MountTable::folderOf(const std::string &path) {
+    const auto [known, isNew] = folders_.try_emplace(path);
+    Folder &folder = known->second;
+    if (isNew) {
+        const auto real = realPath(path.empty() ? "/" : path);
+        folder.isThere = real.has_value();
+        folder.mount = mountAbove(real ? *real : nearestRealPath(path));
+        folder.realPath = real && *real != "/" ? *real : "";
+    }
+    return folder;
+}
+
+/* Asked about many files of a folder, its links are listed once instead of looked for each time. */
+bool MountTable::isLinkIn(Folder &folder, const std::string &path, const std::string &name) {
+    if (++folder.timesAsked < kManyFiles) {
+        return isLink(path);
+    }
+    if (folder.timesAsked == kManyFiles) {
+        folder.links = linksIn(path.substr(0, path.size() - name.size()));
+    }
+    return folder.links.count(name) != 0;
+}
+
 bool MountTable::refresh() {
+    const auto now = std::chrono::steady_clock::now();
+    if (now < foldersEnd_ && folders_.size() < kMaxFolders) {
+        return true;
+    }
+    folders_.clear();
+    foldersEnd_ = now + folderLifetime_;
     if (!source_->hasChanged()) {
         return true;
     }
     mounts_.clear();
-    realFolders_.clear();
     const auto text = source_->contents();
     std::string_view rest = text ? *text : std::string_view();
     while (!rest.empty()) {
@@ -163,6 +228,7 @@ bool MountTable::refresh() {
         addMount(line);
         rest.remove_prefix(std::min(line.size() + 1, rest.size()));
     }
+    foldersEnd_ = text ? foldersEnd_ : std::chrono::steady_clock::time_point();
     return text.has_value();
 }
 
@@ -182,30 +248,6 @@ void MountTable::addMount(std::string_view line) {
     Mount &mount = mounts_[unescaped(mountPoint)];
     mount = {std::string(device), std::string(takeWord(line)), {}, 0};
     mount.source = unescaped(takeWord(line));
-}
-
-/* The path without links, from the nearest parent that exists. In a folder that is remembered it
- * takes one look, where following every step of the path takes one for each. */
-std::string MountTable::realPathOf(const std::string &path) {
-    const bool isPlain = path.back() != '/' && !path.ends_with("/.") && !path.ends_with("/..");
-    if (isPlain && !isLink(path)) {
-        return realFolder(parentOf(path)) + path.substr(path.rfind('/'));
-    }
-    return nearestRealPath(path);
-}
-
-const std::string &MountTable::realFolder(const std::string &folder) {
-    const auto now = std::chrono::steady_clock::now();
-    if (now >= foldersEnd_ || realFolders_.size() >= kMaxFolders) {
-        realFolders_.clear();
-        foldersEnd_ = now + folderLifetime_;
-    }
-    const auto [known, isNew] = realFolders_.try_emplace(folder);
-    if (isNew) {
-        std::string real = nearestRealPath(folder);
-        known->second = real == "/" ? "" : std::move(real);
-    }
-    return known->second;
 }
 
 MountTable::Mounts::value_type *MountTable::mountAbove(std::string realPath) {

@@ -8,6 +8,7 @@
 #include <string>
 #include <string_view>
 #include <unordered_map>
+#include <unordered_set>
 
 namespace zano::volumes {
 
@@ -39,7 +40,7 @@ std::unique_ptr<MountSource> processMounts();
 class MountTable {
   public:
     /* blockDevices: a folder of links MAJOR:MINOR to devices, as /sys/dev/block.
-     * folderLifetime: how long it is remembered where the links of a folder lead. */
+     * folderLifetime: how long it is remembered where links lead, and what is mounted. */
     MountTable(std::unique_ptr<MountSource> source, std::string blockDevices,
                std::chrono::milliseconds folderLifetime)
         : source_(std::move(source)),
@@ -59,10 +60,21 @@ class MountTable {
     };
     using Mounts = std::unordered_map<std::string, Mount>;  // by mount point
 
+    /* A folder that was asked about: the songs of a playlist lie in a few. */
+    struct Folder {
+        bool isThere = false;
+        std::string realPath;  // "" for the root
+        Mounts::value_type *mount = nullptr;
+        int timesAsked = 0;
+        std::unordered_set<std::string> links;  // names, once it was asked often
+    };
+
     bool refresh();
     void addMount(std::string_view line);
-    std::string realPathOf(const std::string &path);
-    const std::string &realFolder(const std::string &folder);
+    static bool isPlain(std::string_view path);
+    Mounts::value_type *mountOfPlain(const std::string &path);
+    Folder &folderOf(const std::string &path);
+    static bool isLinkIn(Folder &folder, const std::string &path, const std::string &name);
     Mounts::value_type *mountAbove(std::string realPath);
     int typeOf(const Mount &mount) const;
     bool isOnUsb(const std::string &device, int depth) const;
@@ -72,8 +84,7 @@ class MountTable {
     const std::chrono::milliseconds folderLifetime_;
     std::mutex mutex_;
     Mounts mounts_;
-    /* The songs of a playlist lie in a few folders. "" for the root. */
-    std::unordered_map<std::string, std::string> realFolders_;
+    std::unordered_map<std::string, Folder> folders_;
     std::chrono::steady_clock::time_point foldersEnd_;
 };
 

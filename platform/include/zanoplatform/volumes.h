@@ -22,8 +22,8 @@ typedef struct VOLUME_INFO {
  * is one whose block device, or one that this stands on, hangs on a USB bus; a network volume is
  * told by its file system; every other is internal. 0, or -1 for a null argument, a path that is
  * not absolute, or when the mounts cannot be read; *volume is then untouched. Looks at each
- * mount's device once in a process and again when the mounts change; where a folder's links lead
- * is remembered for a tenth of a second. Any thread. */
+ * mount's device once in a process and again when the mounts change; what is mounted, and where
+ * links lead, is remembered for a tenth of a second. Any thread. */
 ZANOPLATFORM_API int VolumePathParse(const char *path, VOLUME_INFO *volume);
 
 ZANOPLATFORM_C_API_END
