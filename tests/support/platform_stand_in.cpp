@@ -65,11 +65,11 @@ ZANO_PLAYLIST_REC *parsed(const std::string &playlist, int *total, int third, in
     note("parse(" + playlist + ", " + std::to_string(third) + ", " + std::to_string(fourth) + ", " +
          quoted(fields) + ", " + std::to_string(last) + ")");
     ZANO_PLAYLIST_REC *list = nullptr;
-    for (auto entry = theScript.entries.rbegin(); entry != theScript.entries.rend(); ++entry) {
-        auto *const node = static_cast<ZANO_PLAYLIST_REC *>(std::malloc(sizeof(ZANO_PLAYLIST_REC)));
-        node->info = *entry;
-        node->next = list;
-        list = node;
+    ZANO_PLAYLIST_REC **tail = &list;
+    for (const ZANO_MEDIA_INFO &entry : theScript.entries) {
+        *tail = static_cast<ZANO_PLAYLIST_REC *>(std::calloc(1, sizeof(ZANO_PLAYLIST_REC)));
+        (*tail)->info = entry;
+        tail = &(*tail)->next;
     }
     *total = static_cast<int>(theScript.entries.size()) - theScript.missingFromTotal;
     return list;
