@@ -23,4 +23,24 @@ Outcome showCommand(const Request &request, const Terminal &terminal);
 /* {"total": number} */
 Outcome countCommand(const Request &request, const Terminal &terminal);
 
+/* Of playlists; each document has "playlist", but for the first:
+ *   list                    {"playlists": [...], "offset", "limit", "total"}
+ *   show                    "entries": [...], "known", "offset", "limit", "total"
+ *   create, export          "total": its entries; of an export also "file"
+ *   import                  "total", "known": how many of them the media database has
+ *   append, insert, move    "changed": true, "total"
+ *   remove, prune           "removed": [...] too
+ * Entries are songs with their "position", from 1, and id 0 when they are not in the database. */
+Outcome playlistListCommand(const Request &request, const Terminal &terminal);
+Outcome playlistShowCommand(const Request &request, const Terminal &terminal);
+Outcome playlistCreateCommand(const Request &request, const Terminal &terminal);
+Outcome playlistAppendCommand(const Request &request, const Terminal &terminal);
+Outcome playlistInsertCommand(const Request &request, const Terminal &terminal);
+Outcome playlistRemoveCommand(const Request &request, const Terminal &terminal);
+Outcome playlistMoveCommand(const Request &request, const Terminal &terminal);
+Outcome playlistPruneCommand(const Request &request, const Terminal &terminal);
+Outcome playlistDeleteCommand(const Request &request, const Terminal &terminal);
+Outcome playlistImportCommand(const Request &request, const Terminal &terminal);
+Outcome playlistExportCommand(const Request &request, const Terminal &terminal);
+
 }  // namespace vorelix

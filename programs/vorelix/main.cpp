@@ -42,6 +42,8 @@ ExitCode run(const vorelix::Request &request) {
 int main(int argc, char **argv) {
     // A reader that has seen enough (head) ends the program quietly, whatever was inherited.
     std::signal(SIGPIPE, SIG_DFL);
+    // A limit of file sizes is a failed write, which is cleaned up after.
+    std::signal(SIGXFSZ, SIG_IGN);
     try {
         const auto parsed = vorelix::parseCommandLine(argc, argv, vorelix::allCommands());
         const auto *request = std::get_if<vorelix::Request>(&parsed);

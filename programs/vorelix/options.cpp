@@ -1,11 +1,12 @@
 #include "options.h"
 
 #include <CLI/CLI.hpp>
-#include <charconv>
 #include <cstdint>
 #include <iostream>
 #include <limits>
 
+#include "option_checks.h"
+#include "playlist_options.h"
 #include "text.h"
 
 namespace vorelix {
@@ -22,22 +23,6 @@ struct Paging {
     int offset = -1;
     int limit = 0;
 };
-
-/* The whole text in decimal; CLI11 by itself takes 010 for 8. */
-CLI::Validator wholeNumber(int least, int most) {
-    const std::string range = "from " + std::to_string(least) + " to " + std::to_string(most);
-    return {[=](std::string &text) {
-                int number = 0;
-                const char *end = text.data() + text.size();
-                const auto [rest, error] = std::from_chars(text.data(), end, number);
-                if (error != std::errc() || rest != end || number < least || number > most) {
-                    return "'" + printable(text) + "' is not a whole number " + range;
-                }
-                text = std::to_string(number);
-                return std::string();
-            },
-            ""};
-}
 
 CLI::Validator searchText() {
     return {[](std::string &text) -> std::string {
@@ -145,9 +130,19 @@ void resolvePaging(const Paging &paging, Request &request) {
 /* The parser of the whole line. Every command writes into the same request, since only one of
  * them is given. */
 struct Parser {
-    CLI::App app{"Lists, searches and browses the music that zanoindex found.", "vorelix"};
+    CLI::App app{"Lists, searches and browses the music that zanoindex found; makes playlists.",
+                 "vorelix"};
     Request request;
     Paging paging;
+
+    /* Behind its group's name stands the name of a command. */
+    CLI::App &add(const Command &command) {
+        const std::string name = command.name;
+        const size_t blank = name.find(' ');
+        CLI::App &parent =
+            blank == std::string::npos ? app : *app.get_subcommand(name.substr(0, blank));
+        return *parent.add_subcommand(name.substr(name.rfind(' ') + 1), command.description);
+    }
 
     explicit Parser(const std::vector<Command> &commands) {
         app.set_version_flag("--version", "vorelix " VORELIX_VERSION);
@@ -156,23 +151,30 @@ struct Parser {
         app.require_subcommand(0, 1);  // an unknown command is named when none is required
         app.fallthrough();
         for (const Command &command : commands) {
-            CLI::App *sub = app.add_subcommand(command.name, command.description);
-            addOperands(*sub, command.arguments, request);
-            addFilter(*sub, command.arguments, request);
-            addOrder(*sub, command.arguments, request);
-            addPaging(*sub, command.arguments, request, paging);
-            sub->footer("Also --json and --verbose: see vorelix --help");
-            sub->callback([this, &command] { request.command = &command; });
+            CLI::App &sub = add(command);
+            if (command.run == nullptr) {
+                sub.require_subcommand(0, 1);
+                continue;
+            }
+            addOperands(sub, command.arguments, request);
+            addFilter(sub, command.arguments, request);
+            addOrder(sub, command.arguments, request);
+            addPaging(sub, command.arguments, request, paging);
+            addPlaylistArguments(sub, command.arguments, request.playlist);
+            sub.footer("Also --json and --verbose: see vorelix --help");
+            sub.callback([this, &command] { request.command = &command; });
         }
     }
 };
 
 ExitCode complain(const CLI::ParseError &error, const Parser &parser) {
-    std::string help = "vorelix --help";
-    for (const CLI::App *sub : parser.app.get_subcommands()) {
-        help = "vorelix " + sub->get_name() + " --help";
+    std::string command = "vorelix";
+    const CLI::App *app = &parser.app;
+    while (!app->get_subcommands().empty()) {
+        app = app->get_subcommands().front();
+        command += " " + app->get_name();
     }
-    std::cerr << "vorelix: " << printable(error.what()) << "; see " << help << '\n';
+    std::cerr << "vorelix: " << printable(error.what()) << "; see " << command << " --help\n";
     return kUsage;
 }
 
@@ -187,6 +189,7 @@ std::variant<Request, ExitCode> parseCommandLine(int argc, const char *const *ar
             throw CLI::RequiredError("A command");
         }
         resolvePaging(parser.paging, parser.request);
+        finishPlaylistArguments(parser.request.command->arguments, parser.request.playlist);
     } catch (const CLI::Success &help) {
         parser.app.exit(help);
         return kSuccess;

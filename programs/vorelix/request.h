@@ -28,13 +28,42 @@ enum Arguments : unsigned {
     kColumn = 1U << 7,           // artist|album|genre
     kIds = 1U << 8,              // ID...
     kNumber = 1U << 9,           // N
+    // of playlists
+    kPlaylist = 1U << 10,   // PLAYLIST
+    kNewTitle = 1U << 11,   // NAME
+    kFile = 1U << 12,       // FILE
+    kPlace = 1U << 13,      // POSITION
+    kPositions = 1U << 14,  // POSITION...
+    kMoved = 1U << 15,      // FROM... TO
+    kSongs = 1U << 16,      // ID... --path
+    kNoSongs = 1U << 17,    // of which there may be none
+    kForm = 1U << 18,       // --form
+    kTitle = 1U << 19,      // --name
+    kTo = 1U << 20,         // --to
+    kForce = 1U << 21,      // --force
+    kDirectory = 1U << 22,  // --dir
+    kWait = 1U << 23,       // --wait
 };
 
 struct Command {
-    const char *name;
+    const char *name;  // "list", or of a group "playlist list"
     const char *description;
     unsigned arguments;
-    Outcome (*run)(const Request &request, const Terminal &terminal);
+    Outcome (*run)(const Request &request, const Terminal &terminal);  // null: a group of commands
+};
+
+/* What playlist commands were given; positions as readRange takes them. */
+struct PlaylistRequest {
+    std::string name;       // id, title or path; the title of a new one
+    std::string directory;  // of personal playlists; "": shared ones
+    std::string file;       // to import from or to export to
+    std::string place;
+    std::vector<std::string> positions;
+    std::vector<std::string> songs;  // ids, or "-" for those on standard input
+    std::vector<std::string> paths;
+    std::string form = "m3u";
+    bool force = false;
+    int waitSeconds = 10;
 };
 
 struct Request {
@@ -48,6 +77,7 @@ struct Request {
     bool byPage = true;  // the span was not given as an offset or limit
     std::string column;
     std::vector<int> ids;
+    PlaylistRequest playlist;
 };
 
 }  // namespace vorelix

@@ -29,23 +29,11 @@ constexpr SortKey kSortKeys[] = {
     {"random", kRandomOrder},
 };
 
-/* The keyword as it stands between % and % in a quoted pattern: taken literally. */
-std::string patternOf(const std::string &keyword) {
-    std::string pattern;
-    for (const char c : keyword) {
-        if (c == '\\' || c == '%' || c == '_') {
-            pattern += '\\';
-        }
-        pattern.append(c == '\'' ? 2 : 1, c);
-    }
-    return pattern;
-}
-
 std::string conditionOf(const Filter &filter) {
     if (filter.keyword.empty()) {
         return {};
     }
-    const std::string like = " ilike '%" + patternOf(filter.keyword) + "%'";
+    const std::string like = " ilike '%" + literalPattern(filter.keyword) + "%'";
     std::string condition;
     for (const char *column : kSearchable) {
         if (filter.in == kAnyColumn || filter.in == column) {
@@ -90,6 +78,17 @@ Listing browse(const Columns &columns, const Filter &filter, const Span &span, c
 }
 
 }  // namespace
+
+std::string literalPattern(const std::string &text) {
+    std::string pattern;
+    for (const char c : text) {
+        if (c == '\\' || c == '%' || c == '_') {
+            pattern += '\\';
+        }
+        pattern.append(c == '\'' ? 2 : 1, c);
+    }
+    return pattern;
+}
 
 void FreeRecords::operator()(ZANO_PLAYLIST_REC *list) const {
     ZANOPlaylistRecFree(list);

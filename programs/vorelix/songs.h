@@ -44,6 +44,9 @@ struct Listing {
     int total;
 };
 
+/* A text as it stands between the quotes of a pattern, taken literally. */
+std::string literalPattern(const std::string &text);
+
 std::vector<std::string> searchableNames();
 std::vector<std::string> sortNames();
 
