@@ -1,0 +1,139 @@
+// This file defines what a fortified build would turn into other calls.
+#undef _FORTIFY_SOURCE
+
+#include <sys/resource.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+#include <vorelix/misc/misc.h>
+
+#include <array>
+#include <cstdint>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "support/failing_allocator.h"
+#include "support/platform_stand_in.h"
+#include "system_paths_internal.h"
+
+namespace {
+
+bool readsShort = false;
+
+}  // namespace
+
+// Takes the place of the system's function for this program.
+extern "C" __attribute__((visibility("default"))) ssize_t read(int file, void *out, size_t size) {
+    return syscall(SYS_read, file, out, readsShort ? size / 2 : size);
+}
+
+namespace {
+
+namespace fs = std::filesystem;
+
+class Mimetype : public stand_in::Test {
+  protected:
+    Mimetype() {
+        // None, and above all not that of an empty file.
+        failing_allocator::failOnSize(SIZE_MAX);
+        for (const fs::path path : {ZANO_PATH_MIME_MAPPING, ZANO_PATH_MIME_GENERATOR}) {
+            fs::create_directories(path.parent_path());
+            fs::remove_all(path);
+        }
+    }
+    ~Mimetype() override {
+        fs::remove_all(ZANO_PATH_MIME_MAPPING);
+        fs::remove(ZANO_PATH_MIME_GENERATOR);
+    }
+    static void map(const std::string &text) { std::ofstream(ZANO_PATH_MIME_MAPPING) << text; }
+    static void generateWith(const std::string &script) {
+        std::ofstream(ZANO_PATH_MIME_GENERATOR) << "#!/bin/sh\n" << script;
+        fs::permissions(ZANO_PATH_MIME_GENERATOR, fs::perms::owner_all);
+    }
+    /* The type, or the result of a failure. */
+    static std::string typeOf(const char *extension) {
+        std::array<char, 64> out{};
+        const int result = ZANOAudioGetMimetype(extension, out.data(), out.size());
+        return result == 0 ? out.data() : std::to_string(result);
+    }
+};
+
+TEST_F(Mimetype, IsTheSecondQuotedTextBehindTheFirstPlaceOfTheExtension) {
+    const std::string unknown = "application/octet-stream";
+    const struct {
+        const char *mapping;
+        std::string type;
+    } cases[] = {
+        {"\"mp3\" \"audio/mpeg\"\n", "audio/mpeg"},
+        {"\"ogg\" \"audio/ogg\"\n\"mp3\"=\"audio/mpeg\"", "audio/mpeg"},
+        {"\"xmp3x\" \"wrong\"\n\"mp3\" \"right\"", "wrong"},
+        {"\"mp3\" \"audio/to the end", "audio/to the end"},
+        {"\"mp3\" \"", ""},
+        {"\"mp3\" ", unknown},
+        {"mp3", unknown},
+        {"\"mp\" \"a\"", unknown},
+        {"", unknown},
+    };
+    for (const auto &each : cases) {
+        map(each.mapping);
+        EXPECT_EQ(typeOf("mp3"), each.type) << each.mapping;
+    }
+    EXPECT_EQ(stand_in::takeTrace(), "");
+}
+
+TEST_F(Mimetype, IsCutToItsBuffer) {
+    map("\"mp3\" \"audio/mpeg\"");
+    const std::pair<int, const char *> cases[] = {{6, "audio"}, {11, "audio/mpeg"}, {1, ""}};
+    for (const auto &[size, type] : cases) {
+        std::vector<char> out(static_cast<std::size_t>(size), '?');
+        EXPECT_EQ(ZANOAudioGetMimetype("mp3", out.data(), size), 0);
+        EXPECT_STREQ(out.data(), type);
+    }
+    std::array<char, 1> untouched{'?'};
+    EXPECT_EQ(ZANOAudioGetMimetype("mp3", untouched.data(), 0), 0);
+    EXPECT_EQ(ZANOAudioGetMimetype("mp3", untouched.data(), -1), 0);
+    EXPECT_EQ(ZANOAudioGetMimetype(nullptr, untouched.data(), 1), -1);
+    EXPECT_EQ(untouched[0], '?');
+    EXPECT_EQ(ZANOAudioGetMimetype("mp3", nullptr, 1), -1);
+}
+
+TEST_F(Mimetype, ComesFromAMappingThatIsMadeOnce) {
+    generateWith("echo '\"mp3\" \"audio/made\"'\n");
+    EXPECT_EQ(typeOf("mp3"), "audio/made");
+    generateWith("echo '\"mp3\" \"audio/again\"'\n");
+    EXPECT_EQ(typeOf("mp3"), "audio/made");
+    fs::remove(ZANO_PATH_MIME_MAPPING);
+    EXPECT_EQ(typeOf("mp3"), "audio/again");
+    EXPECT_EQ(stand_in::takeTrace(), "");
+}
+
+TEST_F(Mimetype, FailsWhereTheMappingCannotBeMadeOrRead) {
+    fs::create_directory(ZANO_PATH_MIME_MAPPING);
+    EXPECT_EQ(typeOf("mp3"), "-1");
+    EXPECT_EQ(stand_in::takeTrace(), "3 misc:239 Could not generat the mimetype mapping file\n");
+    fs::remove(ZANO_PATH_MIME_MAPPING);
+
+    map("\"mp3\" \"audio/mpeg\"");
+    rlimit limit{};
+    ASSERT_EQ(getrlimit(RLIMIT_NOFILE, &limit), 0);
+    const rlimit none{0, limit.rlim_max};
+    ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &none), 0);
+    const std::string type = typeOf("mp3");
+    ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &limit), 0);
+    EXPECT_EQ(type, "-1");
+    EXPECT_EQ(stand_in::takeTrace(), "3 misc:244 Could not open the mimetype mapping file\n");
+
+    failing_allocator::failOnSize(fs::file_size(ZANO_PATH_MIME_MAPPING));
+    EXPECT_EQ(typeOf("mp3"), "-1");
+    EXPECT_TRUE(failing_allocator::hasFailed());
+    EXPECT_EQ(stand_in::takeTrace(), "3 misc:252 Malloc memory failed\n");
+
+    readsShort = true;
+    EXPECT_EQ(typeOf("mp3"), "-1");
+    readsShort = false;
+    EXPECT_EQ(stand_in::takeTrace(), "3 misc:258 Failed to read file\n");
+    EXPECT_EQ(typeOf("mp3"), "audio/mpeg");
+}
+
+}  // namespace
