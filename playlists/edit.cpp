@@ -21,6 +21,7 @@ namespace vorelix::playlist {
 namespace {
 
 constexpr const char *kAllFields = "*";
+// Intended and kept: a removal writes no other tags, for it reads none.
 constexpr const char *kRemovalFields = "id, path, title, album";
 constexpr int kSelectionCapacity = 1024;
 
@@ -86,7 +87,7 @@ StringList splitSelection(const char *selection) {
     PSZLIST split = positions.release();
     const int count = KLIBCStrSep(selection, ",", &split);
     positions.reset(split);
-    // Only an empty text has no positions.
+    // Only an empty text has no positions; any other was not split for want of memory.
     return count >= 0 || *selection == '\0' ? std::move(positions) : nullptr;
 }
 

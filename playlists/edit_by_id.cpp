@@ -6,8 +6,10 @@
 #include "edit_internal.h"
 #include "edit_messages_internal.h"
 #include "log_internal.h"
+#include "media_rows_internal.h"
 #include "playlists_internal.h"
 
+using vorelix::asInt;
 using vorelix::LogMessage;
 using namespace vorelix::playlist;
 
@@ -26,8 +28,7 @@ class SharedPlaylist {
   public:
     explicit SharedPlaylist(const char *id)
         : id_(id),
-          hasPath_(ZANOPlaylistPathGet(playlistId(id), path_.data(),
-                                       vorelix::asInt(path_.size())) == 0) {}
+          hasPath_(ZANOPlaylistPathGet(playlistId(id), path_.data(), asInt(path_.size())) == 0) {}
 
     operator Playlist() const { return {id_, path_.data()}; }
 
@@ -38,7 +39,7 @@ class SharedPlaylist {
         return hasPath_;
     }
 
-    /* Without regard to how the lookup ended. */
+    /* Looks at the path alone, whatever the lookup gave. */
     bool hasFile(const LogMessage<const char *, const char *> &failure) const {
         if (access(path_.data(), F_OK) == 0) {
             return true;

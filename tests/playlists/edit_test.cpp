@@ -223,6 +223,7 @@ TEST_P(Edit, AppendsAsManyAsCounted) {
 
 TEST_P(Edit, KeepsTracksAddressesAndUsb) {
     script().entries = songs("kept gone");
+    script().entries[0].id = -1;
     script().entries[1].id = 0;
     for (const char *path : {"HTTP://host/x", "https://host/x", "/usb/a.mp3", "http:/a", ""}) {
         script().entries.push_back({});
@@ -311,6 +312,8 @@ TEST_P(Edit, OutOfMemory) {
     script().splitFails = true;
     EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
     EXPECT_EQ(takeTrace(), looked() + noList);
+    EXPECT_EQ(GetParam().removeSongs(playlist(), ""), 0);
+    takeTrace();
     script().stringListFails = true;
     EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
     EXPECT_EQ(takeTrace(), looked() + noList.substr(kSorted.size()));
