@@ -10,6 +10,7 @@
 #include "playlist_answers.h"
 #include "playlist_catalogue.h"
 #include "playlist_draft.h"
+#include "playlist_input.h"
 
 namespace vorelix {
 
@@ -117,7 +118,7 @@ bool isGone(const ZANO_MEDIA_INFO &entry) {
 }  // namespace
 
 Outcome playlistAppendCommand(const Request &request, const Terminal &) {
-    const SongList list = newEntries(request.playlist.songs, request.playlist.paths);
+    const SongList list = newEntries(wantedEntries(request.playlist.songs, request.playlist.paths));
     const Entries more = entriesOf(list);
     const Changed outcome = changed(
         request.playlist, [&](const Entries &old) { return spliced(old, old.size(), more); });
@@ -125,7 +126,7 @@ Outcome playlistAppendCommand(const Request &request, const Terminal &) {
 }
 
 Outcome playlistInsertCommand(const Request &request, const Terminal &) {
-    const SongList list = newEntries(request.playlist.songs, request.playlist.paths);
+    const SongList list = newEntries(wantedEntries(request.playlist.songs, request.playlist.paths));
     const Entries more = entriesOf(list);
     const Changed outcome = changed(request.playlist, [&](const Entries &old) {
         return spliced(old, destinationOf(request.playlist.place, old.size() + 1), more);

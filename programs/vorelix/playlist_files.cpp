@@ -12,6 +12,7 @@
 #include "playlist_answers.h"
 #include "playlist_catalogue.h"
 #include "playlist_draft.h"
+#include "playlist_input.h"
 #include "text.h"
 
 namespace vorelix {
@@ -126,7 +127,7 @@ std::string textOfNew(const char *what, const Playlist &playlist, size_t total) 
 
 Outcome playlistCreateCommand(const Request &request, const Terminal &) {
     const PlaylistRequest &wanted = request.playlist;
-    const SongList list = newEntries(wanted.songs, wanted.paths);
+    const SongList list = newEntries(wantedEntries(wanted.songs, wanted.paths));
     const Entries entries = entriesOf(list);
     Playlist playlist = newPlaylist(wanted.name, wanted.form, wanted.directory);
     Draft draft = draftOf(playlist.path, wanted);

@@ -4,7 +4,7 @@
 
 #include "option_checks.h"
 #include "playlist_draft.h"
-#include "playlist_entries.h"
+#include "playlist_input.h"
 #include "text.h"
 
 namespace vorelix {

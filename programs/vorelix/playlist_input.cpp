@@ -1,24 +1,15 @@
-#include "playlist_entries.h"
+#include "playlist_input.h"
 
 #include <json/reader.h>
 #include <json/value.h>
 #include <unistd.h>
-#include <vorelix/playlists/playlist.h>
-#include <zanoplatform/error.h>
-#include <zanoplatform/playlist_parser.h>
 #include <algorithm>
 #include <cerrno>
 #include <charconv>
-#include <cstdio>
-#include <cstdlib>
 #include <cstring>
-#include <filesystem>
 #include <iostream>
-#include <iterator>
-#include <limits>
-#include <map>
-#include <new>
 #include <sstream>
+#include <string_view>
 
 #include "failure.h"
 #include "text.h"
@@ -26,46 +17,6 @@
 namespace vorelix {
 
 namespace {
-
-struct Cause {
-    int code;
-    const char *text;
-};
-
-constexpr Cause kCauses[] = {
-    {KLIB_ERR_PLAYLIST_MISSING,
-     "there is no such file; a playlist whose file is gone leaves the list with: vorelix playlist "
-     "delete"},
-    {KLIB_ERR_PLAYLIST_UNREADABLE, "the file cannot be read"},
-    {KLIB_ERR_PLAYLIST_NOT_ONE, "it is not a playlist; m3u, m3u8, pls and wpl are read"},
-    {KLIB_ERR_PLAYLIST_TOO_LARGE, "it is too large"},
-};
-
-[[noreturn]] void throwParserFailure(const std::string &path) {
-    const int code = KLIBCErrGet();
-    const std::string reason = printable(KLIBCErrTextGet());
-    const std::string what = "read the playlist " + printable(path);
-    for (const Cause &cause : kCauses) {
-        if (cause.code == code) {
-            std::string text = "could not " + what + ": ";
-            throw Failure(text.append(cause.text).append("\nreason: ").append(reason));
-        }
-    }
-    throwDatabaseFailure(what);
-}
-
-/* Tags of a playlist become lines of a playlist again. */
-template <size_t Size>
-void keepInOneLine(char (&text)[Size]) {
-    std::replace_if(
-        std::begin(text), std::end(text), [](char c) { return c == '\n' || c == '\r'; }, ' ');
-}
-
-/* A song, or a place without one. */
-struct Wanted {
-    int id = 0;
-    std::string path;
-};
 
 int numberOf(std::string_view text) {
     int number = 0;
@@ -148,91 +99,10 @@ std::string placeOf(const std::string &path) {
     return place;
 }
 
-/* The songs of these ids; Failure names those that there are not. */
-class Songs {
-  public:
-    explicit Songs(const std::vector<Wanted> &wanted) {
-        std::vector<int> ids;
-        for (const Wanted &each : wanted) {
-            if (each.id != 0 && byId_.try_emplace(each.id).second) {
-                ids.push_back(each.id);
-            }
-        }
-        if (ids.empty()) {
-            return;
-        }
-        list_ = songsById(ids);
-        for (auto *node = list_.get(); node != nullptr; node = node->next) {
-            byId_[node->info.id] = &node->info;
-        }
-        requireAll(ids);
-    }
-
-    const ZANO_MEDIA_INFO &at(int id) const { return *byId_.at(id); }
-
-  private:
-    void requireAll(const std::vector<int> &ids) const {
-        std::string unknown;
-        for (const int id : ids) {
-            if (byId_.at(id) == nullptr) {
-                unknown.append(unknown.empty() ? "" : ", ").append(std::to_string(id));
-            }
-        }
-        if (!unknown.empty()) {
-            throw Failure("no song has the id " + unknown +
-                          ", so nothing was added; the listings show the ids that exist");
-        }
-    }
-
-    SongList list_;
-    std::map<int, const ZANO_MEDIA_INFO *> byId_;
-};
-
-void push(SongList &list, const ZANO_MEDIA_INFO &info) {
-    auto *node = static_cast<ZANO_PLAYLIST_REC *>(std::malloc(sizeof(ZANO_PLAYLIST_REC)));
-    if (node == nullptr) {
-        throw std::bad_alloc();
-    }
-    node->info = info;
-    node->next = list.release();
-    list.reset(node);
-}
-
 }  // namespace
 
-SongList readEntries(const std::string &path) {
-    int total = 0;
-    SongList list(ParsePlayListByFieldGivenPath(path.c_str(), &total, 0, 0, "*", 1));
-    if (list == nullptr && KLIBCErrGet() != KLIB_ERR_NONE) {
-        throwParserFailure(path);
-    }
-    for (auto *node = list.get(); node != nullptr; node = node->next) {
-        keepInOneLine(node->info.title);
-        keepInOneLine(node->info.artist);
-        keepInOneLine(node->info.album);
-        keepInOneLine(node->info.genre);
-    }
-    return list;
-}
-
-Entries entriesOf(const SongList &list) {
-    Entries entries;
-    for (auto *node = list.get(); node != nullptr; node = node->next) {
-        entries.push_back(&node->info);
-    }
-    return entries;
-}
-
-void setPath(ZANO_MEDIA_INFO &entry, const std::string &path) {
-    std::snprintf(entry.path, sizeof entry.path, "%s", path.c_str());
-}
-
-int knownAmong(const Entries &entries) {
-    return static_cast<int>(std::count_if(entries.begin(), entries.end(),
-                                          [](const auto *entry) { return entry->id != 0; }));
-}
-
-SongList newEntries(const std::vector<std::string> &ids, const std::vector<std::string> &paths) {
+std::vector<Wanted> wantedEntries(const std::vector<std::string> &ids,
+                                  const std::vector<std::string> &paths) {
     std::vector<Wanted> wanted;
     for (const std::string &id : ids) {
         const std::vector<Wanted> more =
@@ -240,18 +110,9 @@ SongList newEntries(const std::vector<std::string> &ids, const std::vector<std::
         wanted.insert(wanted.end(), more.begin(), more.end());
     }
     for (const std::string &path : paths) {
-        wanted.push_back({0, path});
+        wanted.push_back({0, placeOf(path)});
     }
-    const Songs songs(wanted);
-    SongList list;
-    for (const Wanted &each : wanted) {
-        ZANO_MEDIA_INFO entry{};
-        if (each.id == 0) {
-            setPath(entry, placeOf(each.path));
-        }
-        push(list, each.id == 0 ? entry : songs.at(each.id));
-    }
-    return SongList(PlaylistRecReverse(list.release()));
+    return wanted;
 }
 
 bool readRange(const std::string &text, PositionRange &range) {
@@ -290,10 +151,6 @@ size_t destinationOf(const std::string &position, size_t last) {
                       std::to_string(last) + ", so nothing was changed");
     }
     return place - 1;
-}
-
-std::string absolutePath(const std::string &path) {
-    return std::filesystem::absolute(path).lexically_normal();
 }
 
 }  // namespace vorelix
