@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <json/reader.h>
 #include <pty.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -77,12 +78,25 @@ std::vector<char *> pointersTo(std::vector<std::string> &texts) {
     return pointers;
 }
 
+/* At its start, for a program to read. */
+int inputOf(const std::string &text) {
+    const int descriptor = temporaryFile();
+    EXPECT_EQ(write(descriptor, text.data(), text.size()), static_cast<ssize_t>(text.size()));
+    lseek(descriptor, 0, SEEK_SET);
+    return descriptor;
+}
+
 [[noreturn]] void become(const Invocation &invocation, int out, int err) {
     std::vector<std::string> words = {"vorelix"};
     words.insert(words.end(), invocation.arguments.begin(), invocation.arguments.end());
     std::vector<std::string> variables;
     for (const auto &[name, value] : invocation.environment) {
         variables.push_back(name + "=" + value);
+    }
+    dup2(inputOf(invocation.input), STDIN_FILENO);
+    if (invocation.fileSizeLimit > 0) {
+        const rlimit limit{invocation.fileSizeLimit, invocation.fileSizeLimit};
+        setrlimit(RLIMIT_FSIZE, &limit);
     }
     dup2(out, STDOUT_FILENO);
     dup2(err, STDERR_FILENO);
@@ -106,9 +120,7 @@ Ended run(const Invocation &invocation) {
         ended.out = readAll(output.read);
         close(output.read);
     }
-    int status = 0;
-    EXPECT_EQ(waitpid(child, &status, 0), child);
-    ended.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    ended.status = statusOf(child);
     if (invocation.output == Output::File) {
         ended.out = wholeFile(output.written);
     } else if (output.read < 0) {
@@ -116,6 +128,21 @@ Ended run(const Invocation &invocation) {
     }
     ended.err = wholeFile(errors);
     return ended;
+}
+
+pid_t start(const Invocation &invocation) {
+    const pid_t child = fork();
+    if (child == 0) {
+        const int nowhere = open("/dev/null", O_WRONLY);
+        become(invocation, nowhere, nowhere);
+    }
+    return child;
+}
+
+int statusOf(pid_t child) {
+    int status = 0;
+    EXPECT_EQ(waitpid(child, &status, 0), child);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
 }
 
 CommandLine::CommandLine() {

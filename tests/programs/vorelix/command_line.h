@@ -6,6 +6,7 @@
 
 #include <gtest/gtest.h>
 #include <json/value.h>
+#include <sys/types.h>
 
 #include <filesystem>
 #include <map>
@@ -30,9 +31,17 @@ struct Invocation {
     std::map<std::string, std::string> environment = {};  // nothing else is set
     Output output = Output::File;
     unsigned short columns = 0;  // of the terminal
+    std::string input = {};
+    unsigned long fileSizeLimit = 0;  // in bytes, as of a full disk; 0: none
 };
 
 Ended run(const Invocation &invocation);
+
+/* Without its output, and without waiting for it. */
+pid_t start(const Invocation &invocation);
+
+/* As Ended::status. */
+int statusOf(pid_t child);
 
 /* Each test starts without a database and with a setting that names where it would be. */
 class CommandLine : public testing::Test {
