@@ -40,7 +40,6 @@ class LogMessage {
 // Checked by the constructor.
 #pragma GCC diagnostic ignored "-Wformat-nonliteral"
 #pragma GCC diagnostic ignored "-Wformat-security"
-#pragma GCC diagnostic ignored "-Wformat-security"
         if (unit_ != nullptr) {
             syslog(LOG_ERR, format_, unit_, line_, args...);
         } else {
