@@ -12,6 +12,7 @@ enum {
     KLIB_ERR_OUT_OF_MEMORY = 0x0200,
     KLIB_ERR_BAD_PARAMETER = 0x0D00,
     KLIB_ERR_BAD_CONFIGURATION = 0x0E00,
+    KLIB_ERR_FILE_FAILED = 0x0F00,      /* a file cannot be read or written */
     KLIB_ERR_DATABASE_OPEN = 0x1000,    /* missing, unreadable, or not a media database */
     KLIB_ERR_DATABASE_VERSION = 0x1001, /* from a newer version of this program */
     KLIB_ERR_DATABASE_QUERY = 0x1002,   /* text that is not a valid query */
@@ -21,8 +22,8 @@ enum {
 };
 
 /* The code of the last failure in this thread. Calls of the media database, the playlist parser,
- * the volumes and KLIBCStrGet set it, to KLIB_ERR_NONE when they succeed; the lists and the
- * escaping functions leave it alone. */
+ * the volumes, KLIBCFileSetKeyValue and KLIBCStrGet set it, to KLIB_ERR_NONE when they succeed; the
+ * lists and the escaping functions leave it alone. */
 ZANOPLATFORM_API int KLIBCErrGet(void);
 
 /* Its text in English, with the database's own words where it gave any; "" after a success.
