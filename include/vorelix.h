@@ -9,6 +9,7 @@
 #ifndef VORELIX_H
 #define VORELIX_H
 
+#include <vorelix/config/config.h>
 #include <vorelix/library/musiclib.h>
 #include <vorelix/misc/misc.h>
 #include <vorelix/playlists/playlist.h>

@@ -1,0 +1,206 @@
+#include <sys/stat.h>
+#include <vorelix/config/config.h>
+
+#include <array>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+
+#include "config/line_internal.h"
+#include "support/platform_stand_in.h"
+#include "system_paths_internal.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr const char *kPath = ZANO_PATH_AUDIO_CONF;
+constexpr const char *kDefaults =
+    "AS_Player_Source=\"Music\"\nAS_Player_Repeat=\"All\"\nAS_Player_Shuffle=\"Off\"\n"
+    "AS_Default_Music_PLS=\"\"\nAS_Default_IPod_PLS=\"\"\n";
+
+std::string readFile() {
+    std::ifstream file(kPath, std::ios::binary);
+    return file ? std::string(std::istreambuf_iterator<char>(file), {}) : "(no file)";
+}
+
+template <typename Call>
+std::string printed(Call call) {
+    testing::internal::CaptureStdout();
+    call();
+    return testing::internal::GetCapturedStdout();
+}
+
+/* A line as the reader takes it: "key|value", or "" for none. */
+std::string split(const std::string &line) {
+    std::string buffer = line;
+    const auto read = vorelix::config::splitLine(buffer.data());
+    return read ? std::string(read->key) + "|" + read->value : "";
+}
+
+class Configuration : public stand_in::Test {
+  protected:
+    Configuration() {
+        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
+        fs::create_directories(ZANO_PATH_AUDIO_FOLDER);
+    }
+    ~Configuration() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
+    static void write(const std::string &text) { std::ofstream(kPath, std::ios::binary) << text; }
+};
+
+TEST(ConfigurationLine, IsTakenApart) {
+    const struct {
+        const char *line;
+        const char *read;
+    } cases[] = {
+        {"a=\"b\"\n", "a|b"},
+        {"a = \"b\"", "a|b"},
+        {" \ta\t=\t\"b\" \t\n", "a|b"},
+        {"a=b c\n", "a|b c"},
+        {"a b=c", "a b|c"},
+        {"a=\" b \"\n", "a| b "},
+        {"a=\"b=\"c\"\"\n", "a|b=\"c\""},
+        {"a=\"b\n", "a|\"b"},
+        {"a=b\"\n", "a|b\""},
+        {"a=\"\n", "a|"},
+        {"a=\"\"\n", "a|"},
+        {"a=\"\"\"\n", "a|\""},
+        {"a== = b\n", "a|b"},
+        {"a=\"b\"\r\n", "a|\"b\"\r"},
+        {"a=# b\n", "a|# b"},
+        {"a=\n", "a|"},
+        {"a= \t", "a|"},
+        {"a\n", "a|"},
+        {"a", "a|"},
+        {"a b \t\n", "a b|"},
+        {"=b\n", "|b"},
+        {" ==\"b\"\n", "|b"},
+        {"=", "|"},
+        {"\r\n", "\r|"},
+        {"\"a\"=1\n", "\"a\"|1"},
+        {"# a=b\n", ""},
+        {"  #", ""},
+        {"\n", ""},
+        {" \t\n", ""},
+        {" \t", ""},
+        {"", ""},
+    };
+    for (const auto &each : cases) {
+        EXPECT_EQ(split(each.line), each.read) << each.line;
+    }
+}
+
+TEST_F(Configuration, IsReadToItsEndAndNothingStored) {
+    for (const std::string &text :
+         {std::string(), std::string("# c\n\n  a = b\nx\n=\n\0y=1", 20), std::string(5000, '='),
+          "AS_Default_IPod_PLS=\"/p\"\nl=\"" + std::string(2000, 'x') + "\"\n" + kDefaults}) {
+        write(text);
+        ZANO_AUDIO_CONF conf{};
+        conf.currentSource = 7;
+        EXPECT_EQ(printed([&] { EXPECT_EQ(ZANOAudioConfGetALL(&conf), 1) << text; }), "");
+        EXPECT_EQ(conf.currentSource, 7);
+        EXPECT_STREQ(conf.szDefaultIPodPlaylist, "");
+        EXPECT_EQ(printed([] { EXPECT_EQ(ZANOAudioConfPrintALL(), 1); }),
+                  "CurentSource=0\nPlayMode=0\nszDefaultMusicPlaylist=\n");
+    }
+    EXPECT_EQ(stand_in::takeTrace(), "");
+}
+
+TEST_F(Configuration, ThatCannotBeReadIsPrintedAndNotLogged) {
+    const std::string failure = std::string("config (228) Failed to open ") + kPath + ", errno:";
+    ZANO_AUDIO_CONF conf{};
+    const auto read = [&] { EXPECT_EQ(ZANOAudioConfGetALL(&conf), 0); };
+    EXPECT_EQ(printed(read), failure + "2 (No such file or directory)");
+    EXPECT_EQ(printed([] { EXPECT_EQ(ZANOAudioConfPrintALL(), 0); }),
+              failure + "2 (No such file or directory)");
+    fs::create_directory(kPath);
+    EXPECT_EQ(printed(read), failure + "21 (Is a directory)");
+    EXPECT_EQ(printed([] { EXPECT_EQ(ZANOAudioConfGetALL(nullptr), 0); }), "");
+    EXPECT_EQ(stand_in::takeTrace(), "");
+
+    EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", "v", &conf), 1);
+    EXPECT_EQ(ZANOAudioConfMatchKeyValue(nullptr, "v", &conf), 0);
+    EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", nullptr, &conf), 0);
+    EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", "v", nullptr), 0);
+    const std::string line = "3 config(168): Parameter error.\n";
+    EXPECT_EQ(stand_in::takeTrace(), line + line + line);
+}
+
+TEST_F(Configuration, KeysAreSetInPlace) {
+    write(kDefaults);
+    EXPECT_EQ(ZANOAudioConfSet("AS_Player_Repeat", "One"), 1);
+    EXPECT_EQ(ZANOAudioDefaultMusicPLSSet("/volume1/a \"b\".m3u"), 1);
+    EXPECT_EQ(ZANOAudioDefaultIPodPLSSet("/i"), 1);
+    EXPECT_EQ(ZANOAudioCurrentPlayModeSet(), 1);
+    EXPECT_EQ(readFile(),
+              "AS_Player_Source=\"Music\"\nAS_Player_Repeat=\"One\"\nAS_Player_Shuffle=\"Off\"\n"
+              "AS_Default_Music_PLS=\"/volume1/a \"b\".m3u\"\nAS_Default_IPod_PLS=\"/i\"\n");
+    EXPECT_EQ(stand_in::takeTrace(), "");
+}
+
+TEST_F(Configuration, FailedSetsSayTheValueIsEmpty) {
+    const std::string path = kPath;
+    const struct {
+        int (*set)(const char *path);
+        const char *value;
+        std::string trace;
+    } cases[] = {
+        {[](const char *value) { return ZANOAudioConfSet(nullptr, value); }, "v",
+         "3 config(17): Parameter error.\n"},
+        {[](const char *value) { return ZANOAudioConfSet("k", value); }, nullptr,
+         "3 config(17): Parameter error.\n"},
+        {[](const char *value) { return ZANOAudioConfSet("k", value); }, "a\nb",
+         "3 config(22): value of [k] is empty.\n"},
+        {ZANOAudioDefaultMusicPLSSet, nullptr, "3 config(96): Parameter error.\n"},
+        {ZANOAudioDefaultMusicPLSSet, "a\nb",
+         "3 config(22): value of [AS_Default_Music_PLS] is empty.\n3 config(101): Failed to set "
+         "value of key \"AS_Default_Music_PLS\" to " +
+             path + ".\n"},
+        {ZANOAudioDefaultIPodPLSSet, nullptr, "3 config(136): Parameter error.\n"},
+        {ZANOAudioDefaultIPodPLSSet, "a\nb",
+         "3 config(22): value of [AS_Default_IPod_PLS] is empty.\n3 config(141): Failed to set "
+         "value of key \"AS_Default_IPod_PLS\" to " +
+             path + ".\n"},
+    };
+    for (const auto &each : cases) {
+        EXPECT_EQ(each.set(each.value), 0) << each.trace;
+        EXPECT_EQ(stand_in::takeTrace(), each.trace);
+    }
+    EXPECT_FALSE(fs::exists(kPath));
+}
+
+TEST_F(Configuration, IsRestoredOnlyWhereThereIsNone) {
+    const mode_t mask = umask(0);
+    fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
+    EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
+    umask(mask);
+    EXPECT_EQ(readFile(), kDefaults);
+    EXPECT_EQ(readFile().size(), 119U);
+    EXPECT_EQ(fs::status(ZANO_PATH_AUDIO_FOLDER).permissions(), fs::perms(0777));
+    EXPECT_FALSE(fs::exists(ZANO_PATH_AUDIO_CONF_TEMPORARY));
+    write("");
+    EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
+    EXPECT_EQ(readFile(), "");
+    fs::remove(kPath);
+    std::ofstream(ZANO_PATH_AUDIO_CONF_TEMPORARY) << "left over, and longer: " << kDefaults;
+    EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
+    EXPECT_EQ(readFile(), kDefaults);
+    EXPECT_EQ(stand_in::takeTrace(), "");
+}
+
+TEST_F(Configuration, ThatCannotBeRestoredIsLogged) {
+    const fs::path folder = ZANO_PATH_AUDIO_FOLDER;
+    fs::create_directory(ZANO_PATH_AUDIO_CONF_TEMPORARY);
+    EXPECT_EQ(ZANOSonmiraRestoreConf(), 0);
+    EXPECT_EQ(stand_in::takeTrace(), "3 config(339): Failed to open " +
+                                         std::string(ZANO_PATH_AUDIO_CONF_TEMPORARY) + ".\n");
+    const fs::path above = folder.parent_path();
+    const fs::path aside = above.string() + ".aside";
+    fs::rename(above, aside);
+    EXPECT_EQ(ZANOSonmiraRestoreConf(), 0);
+    fs::rename(aside, above);
+    EXPECT_EQ(stand_in::takeTrace(), "3 config(333): Failed to mkdir. [" + folder.string() + "]\n");
+}
+
+}  // namespace
