@@ -37,8 +37,9 @@ void throwDatabaseFailure(const std::string &what) {
     const auto *known = std::find_if(std::begin(kCauses), std::end(kCauses),
                                      [&](const Cause &row) { return row.code == code; });
     const std::string cause = known != std::end(kCauses) ? known->text : kOtherCause;
-    throw Failure("could not " + what + ": " + cause +
-                  (reason.empty() ? "" : "\nreason: " + reason));
+    throw Failure(
+        "could not " + what + ": " + cause + (reason.empty() ? "" : "\nreason: " + reason),
+        FailureKind::kDatabase);
 }
 
 }  // namespace vorelix

@@ -1,4 +1,4 @@
-/* A command could not do what it was asked to. */
+/* What was asked for could not be done. */
 #pragma once
 
 #include <stdexcept>
@@ -6,10 +6,26 @@
 
 namespace vorelix {
 
+/* What a program can tell its callers apart by. */
+enum class FailureKind {
+    kOther,
+    kDatabase,  // the media database gave no answer
+    kNoSong,    // there is no song of an id
+    kNoFile,    // the playlist's file is gone
+    kTaken,     // there is a file of that name already
+    kBusy,      // another program did not end its change in time
+};
+
 /* what() is for the user: what was tried, and what to do next. */
 class Failure : public std::runtime_error {
   public:
-    using std::runtime_error::runtime_error;
+    explicit Failure(const std::string &text, FailureKind kind = FailureKind::kOther)
+        : std::runtime_error(text), kind_(kind) {}
+
+    FailureKind kind() const { return kind_; }
+
+  private:
+    FailureKind kind_;
 };
 
 /* Throws the Failure of a library call that gave no result, right after it: what could not be

@@ -162,13 +162,12 @@ Playlist playlistAt(const std::string &path, const std::string &directory) {
     return {0, fs::path(path).stem(), "", path};
 }
 
+constexpr size_t kMostTitleBytes = NAME_MAX - 4;  // with the ending
+
 void requireTitle(const std::string &title) {
-    constexpr size_t kMostBytes = NAME_MAX - 4;  // with the ending
-    const bool isName = !title.empty() && title.front() != '.' && title.size() <= kMostBytes &&
-                        title.find('/') == std::string::npos && printable(title) == title;
-    if (!isName) {
+    if (!isTitle(title)) {
         throw Failure("could not name a playlist '" + printable(title) + "': a name has 1 to " +
-                      std::to_string(kMostBytes) +
+                      std::to_string(kMostTitleBytes) +
                       " bytes of printable UTF-8, no / and no dot in front");
     }
 }
@@ -220,6 +219,16 @@ Playlist findPlaylist(const std::string &name, const std::string &directory) {
                                                : playlistAt(absolutePath(name), directory);
 }
 
+std::optional<Playlist> playlistById(int id) {
+    const auto rows = sharedPlaylists("id = " + std::to_string(id), kAll).playlists;
+    return rows.empty() ? std::nullopt : std::optional(rows.front());
+}
+
+bool isTitle(const std::string &title) {
+    return !title.empty() && title.front() != '.' && title.size() <= kMostTitleBytes &&
+           title.find('/') == std::string::npos && printable(title) == title;
+}
+
 Playlist newPlaylist(const std::string &title, const std::string &form,
                      const std::string &directory) {
     requireTitle(title);
@@ -239,6 +248,26 @@ void enterPlaylist(Playlist &playlist) {
     }
     const std::vector<Playlist> rows = rowsOf(playlist.path);
     playlist.id = rows.empty() ? 0 : rows.front().id;
+}
+
+void putPlaylist(Playlist &playlist, Draft &draft, bool replaces, const std::string &directory) {
+    const bool isNew = access(playlist.path.c_str(), F_OK) != 0;
+    if (replaces) {
+        draft.putInPlace();
+    } else {
+        draft.putAsNew();
+    }
+    if (!directory.empty()) {
+        return;
+    }
+    try {
+        enterPlaylist(playlist);
+    } catch (const Failure &) {
+        if (isNew) {
+            unlink(playlist.path.c_str());
+        }
+        throw;
+    }
 }
 
 void deletePlaylist(const Playlist &playlist, const std::string &directory, Deadline deadline) {

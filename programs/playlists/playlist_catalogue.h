@@ -5,6 +5,7 @@
  * function here takes: "" means the shared ones. */
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -33,12 +34,22 @@ PlaylistListing listPlaylists(const std::string &directory, const Span &span);
  * the path of any playlist file is taken. Throws Failure for none and for several. */
 Playlist findPlaylist(const std::string &name, const std::string &directory);
 
-/* Throws Failure when a title cannot be a file's name too. Makes the folder. */
+/* The shared playlist with an id, if there is one. Throws Failure when the database cannot tell. */
+std::optional<Playlist> playlistById(int id);
+
+/* Whether a text can be a playlist's title, and so a file's name too. */
+bool isTitle(const std::string &title);
+
+/* Throws Failure for what is no title. Makes the folder. */
 Playlist newPlaylist(const std::string &title, const std::string &form,
                      const std::string &directory);
 
 /* Gives a new shared playlist its row, and it the id. Throws Failure. */
 void enterPlaylist(Playlist &playlist);
+
+/* A draft that was written becomes the new playlist, in place of a file only with `replaces`, and
+ * a shared one is entered. What cannot be entered is taken away again. Throws Failure. */
+void putPlaylist(Playlist &playlist, Draft &draft, bool replaces, const std::string &directory);
 
 /* Deletes file and row, or the file of a personal one. Throws Failure when one of them stays. */
 void deletePlaylist(const Playlist &playlist, const std::string &directory, Deadline deadline);

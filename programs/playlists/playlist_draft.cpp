@@ -98,8 +98,9 @@ Draft::Draft(const std::string &playlist, Deadline deadline)
             while (!tryLock()) {
                 if (std::chrono::steady_clock::now() >= deadline) {
                     throw Failure("could not change " + printable(playlist_) +
-                                  ": another vorelix is changing it; try again, or wait longer "
-                                  "with --wait SECONDS");
+                                      ": another vorelix is changing it; try again, or wait longer "
+                                      "with --wait SECONDS",
+                                  FailureKind::kBusy);
                 }
                 std::this_thread::sleep_for(kPause);
             }
@@ -259,7 +260,8 @@ void Draft::putAsNew() {
         // Network file systems have no such rename.
         if (errno != EINVAL || link(path_.c_str(), playlist_.c_str()) != 0) {
             throw Failure("could not write " + printable(playlist_) + ": " + reasonOf(errno) +
-                          "; --force replaces a file that is there");
+                              "; --force replaces a file that is there",
+                          errno == EEXIST ? FailureKind::kTaken : FailureKind::kOther);
         }
         unlink(path_.c_str());
     }
@@ -303,7 +305,8 @@ struct FileState {
 FileState stateOf(const std::string &path) {
     struct stat file {};
     if (stat(path.c_str(), &file) != 0 || access(path.c_str(), W_OK) != 0) {
-        throw Failure("could not change " + printable(path) + ": " + reasonOf(errno));
+        throw Failure("could not change " + printable(path) + ": " + reasonOf(errno),
+                      errno == ENOENT ? FailureKind::kNoFile : FailureKind::kOther);
     }
     constexpr std::int64_t kNsOfSecond = 1'000'000'000;
     return {file.st_dev, file.st_ino, file.st_size,
@@ -355,7 +358,8 @@ bool editPlaylist(const std::string &path, Deadline deadline, const Change &chan
         }
         if (std::chrono::steady_clock::now() >= deadline) {
             throw Failure("could not change " + printable(path) +
-                          ": another program keeps changing it; try again");
+                              ": another program keeps changing it; try again",
+                          FailureKind::kBusy);
         }
     }
 }

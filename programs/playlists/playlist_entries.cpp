@@ -40,7 +40,9 @@ constexpr Cause kCauses[] = {
     for (const Cause &cause : kCauses) {
         if (cause.code == code) {
             std::string text = "could not " + what + ": ";
-            throw Failure(text.append(cause.text).append("\nreason: ").append(reason));
+            throw Failure(
+                text.append(cause.text).append("\nreason: ").append(reason),
+                code == KLIB_ERR_PLAYLIST_MISSING ? FailureKind::kNoFile : FailureKind::kOther);
         }
     }
     throwDatabaseFailure(what);
@@ -85,7 +87,8 @@ class Songs {
         }
         if (!unknown.empty()) {
             throw Failure("no song has the id " + unknown +
-                          ", so nothing was added; the listings show the ids that exist");
+                              ", so nothing was added; the listings show the ids that exist",
+                          FailureKind::kNoSong);
         }
     }
 

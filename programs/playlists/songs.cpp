@@ -3,6 +3,7 @@
 #include <vorelix/library/musiclib.h>
 #include <vorelix/playlists/playlist.h>
 #include <zanoplatform/media_database.h>
+#include <zanoplatform/sql_escape.h>
 #include <algorithm>
 #include <iterator>
 
@@ -25,14 +26,27 @@ constexpr SortKey kSortKeys[] = {
     {"title", "lower(title)"}, {"artist", "lower(artist)"},
     {"album", "lower(album)"}, {"genre", "lower(genre)"},
     {"year", "year"},          {"duration", "duration"},
-    {"path", "path"},          {"added", "id"},
-    {"random", kRandomOrder},
+    {"track", "track"},        {"path", "path"},
+    {"added", "id"},           {"random", kRandomOrder},
 };
 
-std::string conditionOf(const Filter &filter) {
-    if (filter.keyword.empty()) {
-        return {};
-    }
+std::string withQuotesDoubled(const std::string &text) {
+    std::string escaped(2 * text.size() + 1, '\0');
+    const int length =
+        ZANODBEscapeString(escaped.data(), text.c_str(), static_cast<int>(text.size()));
+    escaped.resize(static_cast<size_t>(std::max(length, 0)));
+    return escaped;
+}
+
+std::string withBackslashesDoubled(const std::string &text) {
+    std::string escaped(2 * text.size() + 1, '\0');
+    const int length =
+        ZANODBEscapeBackslash(escaped.data(), static_cast<int>(escaped.size()), text.c_str());
+    escaped.resize(static_cast<size_t>(std::max(length, 0)));
+    return escaped;
+}
+
+std::string conditionOfKeyword(const Filter &filter) {
     const std::string like = " ilike '%" + literalPattern(filter.keyword) + "%'";
     std::string condition;
     for (const char *column : kSearchable) {
@@ -41,6 +55,32 @@ std::string conditionOf(const Filter &filter) {
         }
     }
     return condition + ")";
+}
+
+/* The search index knows patterns only, and an empty one finds no song without the text. */
+std::string conditionOf(const Exact &exact) {
+    const std::string column = exact.column;
+    const std::string equal = column + " = '" + withQuotesDoubled(exact.text) + "'";
+    return exact.text.empty() ? equal
+                              : column + " ilike '" + literalPattern(exact.text) + "' and " + equal;
+}
+
+std::string conditionOf(const Filter &filter) {
+    std::vector<std::string> parts;
+    if (!filter.folder.empty()) {
+        parts.push_back("path like '" + literalPattern(filter.folder) + "/%'");
+    }
+    for (const Exact &exact : filter.exact) {
+        parts.push_back(conditionOf(exact));
+    }
+    if (!filter.keyword.empty()) {
+        parts.push_back(conditionOfKeyword(filter));
+    }
+    std::string condition;
+    for (const std::string &part : parts) {
+        condition.append(condition.empty() ? "" : " and ").append(part);
+    }
+    return condition;
 }
 
 std::string orderOf(const Order &order) {
@@ -81,13 +121,10 @@ Listing browse(const Columns &columns, const Filter &filter, const Span &span, c
 
 std::string literalPattern(const std::string &text) {
     std::string pattern;
-    for (const char c : text) {
-        if (c == '\\' || c == '%' || c == '_') {
-            pattern += '\\';
-        }
-        pattern.append(c == '\'' ? 2 : 1, c);
+    for (const char c : withBackslashesDoubled(text)) {
+        pattern.append(c == '%' || c == '_' ? "\\" : "").push_back(c);
     }
-    return pattern;
+    return withQuotesDoubled(pattern);
 }
 
 void FreeRecords::operator()(ZANO_PLAYLIST_REC *list) const {

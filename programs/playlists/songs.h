@@ -20,11 +20,19 @@ struct FreeRecords {
 };
 using SongList = std::unique_ptr<ZANO_PLAYLIST_REC, FreeRecords>;
 
+/* A column that has exactly this text. */
+struct Exact {
+    const char *column;
+    std::string text;
+};
+
 /* Songs that have `keyword` in a column, in any case and with any accents; all when it is
  * empty. `in` is one of searchableNames(). */
 struct Filter {
     std::string keyword;
     std::string in = "any";
+    std::vector<Exact> exact;  // all of these too
+    std::string folder;        // and only below this one; "": wherever they stand
 };
 
 /* `by` is one of sortNames(). */

@@ -27,37 +27,6 @@ Draft draftOf(const std::string &path, const PlaylistRequest &request) {
     return {path, deadlineOf(request.waitSeconds)};
 }
 
-void put(Draft &draft, bool force) {
-    if (force) {
-        draft.putInPlace();
-    } else {
-        draft.putAsNew();
-    }
-}
-
-void enter(Playlist &playlist, const PlaylistRequest &request) {
-    if (request.directory.empty()) {
-        enterPlaylist(playlist);
-    }
-}
-
-/* The draft of a new playlist becomes it. What cannot be entered in the media database goes
- * again. */
-void make(Playlist &playlist, Draft &draft, const Entries &entries,
-          const PlaylistRequest &request) {
-    const bool isNew = access(playlist.path.c_str(), F_OK) != 0;
-    draft.write(entries, kSharedMode);
-    put(draft, request.force);
-    try {
-        enter(playlist, request);
-    } catch (const Failure &) {
-        if (isNew) {
-            unlink(playlist.path.c_str());
-        }
-        throw;
-    }
-}
-
 /* The entries of a file as they are best taken over to another folder.
  *
  * What stands at no file where it comes from, stands where it did. But lists of other systems are
@@ -131,7 +100,8 @@ Outcome playlistCreateCommand(const Request &request, const Terminal &) {
     const Entries entries = entriesOf(list);
     Playlist playlist = newPlaylist(wanted.name, wanted.form, wanted.directory);
     Draft draft = draftOf(playlist.path, wanted);
-    make(playlist, draft, entries, wanted);
+    draft.write(entries, kSharedMode);
+    putPlaylist(playlist, draft, wanted.force, wanted.directory);
     if (request.json) {
         return {documentOf(documentOfNew(playlist, entries.size())), ""};
     }
@@ -146,12 +116,15 @@ Outcome playlistImportCommand(const Request &request, const Terminal &) {
     const std::string title =
         wanted.name.empty() ? std::filesystem::path(file).stem().string() : wanted.name;
     Playlist playlist = newPlaylist(title, wanted.form, wanted.directory);
-    if (playlist.path == file) {
-        enter(playlist, wanted);  // it is where it belongs, and only not listed
+    if (playlist.path == file) {  // it is where it belongs, and only not listed
+        if (wanted.directory.empty()) {
+            enterPlaylist(playlist);
+        }
     } else {
         Draft draft = draftOf(playlist.path, wanted);
         import.adaptTo(draft);
-        make(playlist, draft, import.entries(), wanted);
+        draft.write(import.entries(), kSharedMode);
+        putPlaylist(playlist, draft, wanted.force, wanted.directory);
     }
     const Entries &entries = import.entries();
     const int known = knownAmong(entries);
@@ -174,7 +147,11 @@ Outcome playlistExportCommand(const Request &request, const Terminal &) {
     const mode_t mask = umask(0);
     umask(mask);
     draft.write(entriesOf(list), kSharedMode & ~mask);
-    put(draft, wanted.force);
+    if (wanted.force) {
+        draft.putInPlace();
+    } else {
+        draft.putAsNew();
+    }
     const size_t total = entriesOf(list).size();
     if (request.json) {
         Json::Value answer = documentOfNew(playlist, total);
