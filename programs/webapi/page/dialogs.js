@@ -46,7 +46,8 @@ export function choosePlaylist(playlists, add, what) {
     const select = h('select', { id: 'which' }, h('option', { value: '' }, 'New playlist…'),
         playlists.map(({ id, title }) => h('option', { value: id }, title || 'Untitled')));
     const title = h('input', { id: 'new-title', type: 'text', autocomplete: 'off' });
-    const titleRow = h('label', { class: 'field' }, 'Title of the new playlist', title);
+    const field = (label, control) => h('div', { class: 'field' }, h('label', { for: control.id }, label), control);
+    const titleRow = field('Title of the new playlist', title);
     if (playlists.length > 0) {
         select.selectedIndex = 1;
     }
@@ -58,7 +59,7 @@ export function choosePlaylist(playlists, add, what) {
     sync();
     return open({
         title: `Add ${what} to a playlist`, action: 'Add', firstFocus: playlists.length ? select : title,
-        body: [h('label', { class: 'field' }, 'Playlist', select), titleRow],
+        body: [field('Playlist', select), titleRow],
         accept: () => add(select.value
             ? { id: Number(select.value), title: select.selectedOptions[0].textContent }
             : { id: null, title: title.value.trim() }),

@@ -51,13 +51,13 @@ export class PageBar {
     }
 
     #sizes() {
-        const select = h('select', {}, kSizes.map((size) => h('option', { value: size }, String(size))));
+        const select = h('select', { id: 'rows' }, kSizes.map((size) => h('option', { value: size }, String(size))));
         select.value = pageSize();
         select.addEventListener('change', () => {
             storePageSize(select.value);
             this.#onPage(1);
         });
-        return h('label', { class: 'sizes' }, 'Rows ', select);
+        return h('div', { class: 'sizes' }, h('label', { for: 'rows' }, 'Rows'), ' ', select);
     }
 
     #jump() {

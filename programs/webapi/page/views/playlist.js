@@ -34,6 +34,7 @@ export class Playlist extends View {
 
     constructor(app) {
         super(app);
+        this.heading.textContent = this.title;
         this.choice = new Choice([
             { label: 'Remove from playlist', className: 'danger', run: (_, positions) => this.#remove(positions) },
             app.playAction(), app.queueAction(),
@@ -46,6 +47,7 @@ export class Playlist extends View {
         this.empty = h('div');
         this.pages = new PageBar('entries', (page) => app.go('playlist', { ...this.#query, page }, { focus: false }));
         this.body.append(this.hint, this.table, this.empty, this.choice.bar, this.pages.element);
+        this.tools.hidden = this.table.hidden = this.hint.hidden = this.pages.element.hidden = true;
         this.reorder = new Reorder(this.#tbody, (from, to) => this.#move(this.#entries[from], () => this.#first + to, '.move-up'));
         this.unfollow = followPlayer(app.player, () => markCurrent(this.#rows, app.player));
     }
@@ -86,6 +88,7 @@ export class Playlist extends View {
         this.title = title || 'Untitled';
         this.heading.textContent = this.title;
         this.app.retitle();
+        this.tools.hidden = false;
         this.#entries = entries;
         this.#total = total;
         this.#showRows();

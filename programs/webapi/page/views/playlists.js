@@ -15,8 +15,8 @@ export class Playlists extends View {
     constructor(app) {
         super(app);
         this.heading.textContent = this.title;
-        this.field = h('input', { type: 'text', required: true, autocomplete: 'off' });
-        this.form = h('form', { class: 'new-playlist' }, h('label', { class: 'field' }, 'New playlist', this.field),
+        this.field = h('input', { id: 'title', type: 'text', required: true, autocomplete: 'off' });
+        this.form = h('form', { class: 'new-playlist' }, h('div', { class: 'field' }, h('label', { for: 'title' }, 'New playlist'), this.field),
             h('button', { type: 'submit', class: 'button strong' }, 'Create'));
         this.form.addEventListener('submit', (event) => {
             event.preventDefault();

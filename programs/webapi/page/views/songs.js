@@ -51,10 +51,10 @@ export class Songs extends View {
 
     // Narrow screens do not show all headers, so the order is chosen here.
     #sortTools() {
-        this.sort = h('select', {}, columns.map(({ key, label }) => h('option', { value: key }, label === 'No.' ? 'Track' : label)));
+        this.sort = h('select', { id: 'sort' }, columns.map(({ key, label }) => h('option', { value: key }, label === 'No.' ? 'Track' : label)));
         this.sort.addEventListener('change', () => this.#go({ sort: this.sort.value, dir: undefined }));
         this.direction = iconButton('up', 'Reverse the order', { onclick: () => this.#sortBy(this.#order().sort) });
-        return [h('div', { class: 'narrow-sort' }, h('label', {}, 'Sort by ', this.sort), this.direction)];
+        return [h('div', { class: 'narrow-sort' }, h('label', { for: 'sort' }, 'Sort by'), this.sort, this.direction)];
     }
 
     #order() {
