@@ -119,9 +119,10 @@ VORELIX_API int ZANOPlaylistDBUpdate(const ZANO_MEDIA_INFO *row, const char *for
 
 /* Removes the row of a playlist file, which itself is left alone, and tells the indexer. When the
  * database fails to remove the row, the program /usr/zano/bin/zanoindex is asked to, and waited
- * for: see ZANOExec (vorelix/misc/misc.h) for what that means to other threads. Returns what
- * KLIBZanoFileIndexAdd (zanoplatform/media_database.h) returns: 0, or -1 when the indexer could
- * not be told. A row that could not be removed is no failure, and nothing is logged. */
+ * for: see ZANOExec (vorelix/misc/misc.h) for what that means to other threads. The path may not be
+ * null. Returns what KLIBZanoFileIndexAdd (zanoplatform/media_database.h) returns: 0, or -1 when
+ * the indexer could not be told. A row that could not be removed is no failure, and nothing is
+ * logged. */
 VORELIX_API int ZANOPlaylistDBDelete(const char *path);
 
 VORELIX_C_API_END

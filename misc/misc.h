@@ -25,8 +25,10 @@ VORELIX_API void strstrip(char *s);
  *            element is what the program sees as its own name
  *   wait     0: do not wait for its end
  * Waited for: the program's exit status, 0 to 255, of which 255 is also that of a program that
- * could not be started; -1 when no process could be made or when a signal ended the program.
- * Not waited for: 0, or -1 when no process could be made. Nothing is logged.
+ * could not be started; -1 when no process could be made, when a signal ended the program, or when
+ * the caller ignores SIGCHLD (SIG_IGN), so that no status is kept.
+ * Not waited for: 0, or -1 when no process could be made; the caller collects the ended child.
+ * Nothing is logged.
  *
  * The program inherits the environment and the open descriptors that are not close-on-exec. What
  * the caller has buffered for its own output is not written twice. During the call the flag

@@ -75,8 +75,9 @@ VORELIX_API int ZANOPlaylistTotalGet(void);
  *   folderFilter   0: all; else only those whose album, the folder word, is "playlists" in any
  *                  case
  * 0: the list holds the playlists with id, path, title and album. It is empty when there is none,
- * and also, without a line in the log, when the database cannot be opened. -1, with *list null:
- * a null list (not logged), the music link cannot be read, out of memory. */
+ * and also, without a line in the log, when the database cannot be opened; a root of more than 469
+ * bytes (497 without the filter) spoils the condition, which is cut to 511. -1, with *list null: a
+ * null list (not logged), the music link cannot be read, out of memory. */
 VORELIX_API int ZANOPlaylistListAll(ZANO_PLAYLIST **list, int offset, int limit, int folderFilter);
 
 /* The title of a shared playlist.
@@ -102,9 +103,14 @@ VORELIX_API int ZANOPlayListUnlink(const ZANO_PLAYLIST *list);
  *            with another ending is emptied, which is a success; without a '.' nothing is done,
  *            and -1 returned without a line in the log.
  * The entries are only read. Their paths are written from the folder of the playlist ("../a/b.mp3")
- * but for web addresses (http://), files on USB volumes and what is no absolute path, which are
- * written as they are; the last of these is logged for each entry. m3u also has the tags of those
- * entries whose id is 0. Lines are cut to 4127 bytes, their ends included; wpl is not escaped.
+ * but for web addresses (http://, in any case), files on USB volumes, what is no absolute path and
+ * what would have more than 4095 bytes, which are written as they are; each of the last two is
+ * logged. Intended and kept: an entry loses a folder when the playlist's path has, in its place, a
+ * longer name that begins with the folder's. In /music/rock.m3u, /music/rock/a.mp3 is written as
+ * "a.mp3"; give such an entry the relative path "rock/a.mp3" instead.
+ * m3u also has the tags of those entries whose id is 0: title with whole seconds (none without a
+ * title), artist, album, genre, year, disc and track, as far as they are there. Lines are cut to
+ * 4127 bytes, their ends included; wpl is not escaped.
  *
  * 0, or -1: a null array, a null or empty path, a file that cannot be opened, locked or unlocked;
  * all logged. A writer that finds the file locked (flock) by another does not wait, and has emptied
