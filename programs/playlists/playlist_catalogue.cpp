@@ -241,7 +241,11 @@ Playlist newPlaylist(const std::string &title, const std::string &form,
     return {0, title, directory.empty() ? kFolder : title, folder + "/" + title + "." + form};
 }
 
-void enterPlaylist(Playlist &playlist) {
+void enterPlaylist(Playlist &playlist, const std::string &directory) {
+    if (!directory.empty()) {
+        playlist.id = findPlaylist(playlist.path, directory).id;
+        return;
+    }
     const ZANO_MEDIA_INFO row = rowOf(playlist);
     if (ZANOPlaylistDBSave(&row) != 0) {
         throwDatabaseFailure("enter the playlist " + printable(playlist.path));
@@ -257,11 +261,8 @@ void putPlaylist(Playlist &playlist, Draft &draft, bool replaces, const std::str
     } else {
         draft.putAsNew();
     }
-    if (!directory.empty()) {
-        return;
-    }
     try {
-        enterPlaylist(playlist);
+        enterPlaylist(playlist, directory);
     } catch (const Failure &) {
         if (isNew) {
             unlink(playlist.path.c_str());

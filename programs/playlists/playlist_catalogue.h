@@ -44,11 +44,11 @@ bool isTitle(const std::string &title);
 Playlist newPlaylist(const std::string &title, const std::string &form,
                      const std::string &directory);
 
-/* Gives a new shared playlist its row, and it the id. Throws Failure. */
-void enterPlaylist(Playlist &playlist);
+/* Gives a new playlist its id, and a shared one its row. Throws Failure. */
+void enterPlaylist(Playlist &playlist, const std::string &directory);
 
 /* A draft that was written becomes the new playlist, in place of a file only with `replaces`, and
- * a shared one is entered. What cannot be entered is taken away again. Throws Failure. */
+ * it is entered. What cannot be entered is taken away again. Throws Failure. */
 void putPlaylist(Playlist &playlist, Draft &draft, bool replaces, const std::string &directory);
 
 /* Deletes file and row, or the file of a personal one. Throws Failure when one of them stays. */

@@ -154,7 +154,8 @@ SongList newEntries(const std::vector<Wanted> &wanted) {
 }
 
 std::string absolutePath(const std::string &path) {
-    return std::filesystem::absolute(path).lexically_normal();
+    const auto normal = std::filesystem::absolute(path).lexically_normal();
+    return normal.has_filename() || !normal.has_relative_path() ? normal : normal.parent_path();
 }
 
 }  // namespace vorelix

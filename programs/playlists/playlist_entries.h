@@ -33,7 +33,7 @@ struct Wanted {
 /* New entries, as often as they are named. Throws Failure for a song that is not there. */
 SongList newEntries(const std::vector<Wanted> &wanted);
 
-/* An absolute path without "." and "..", taken out by the text alone. */
+/* An absolute path without "." and "..", taken out by the text alone, and without / at its end. */
 std::string absolutePath(const std::string &path);
 
 }  // namespace vorelix

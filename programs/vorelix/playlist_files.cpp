@@ -116,10 +116,8 @@ Outcome playlistImportCommand(const Request &request, const Terminal &) {
     const std::string title =
         wanted.name.empty() ? std::filesystem::path(file).stem().string() : wanted.name;
     Playlist playlist = newPlaylist(title, wanted.form, wanted.directory);
-    if (playlist.path == file) {  // it is where it belongs, and only not listed
-        if (wanted.directory.empty()) {
-            enterPlaylist(playlist);
-        }
+    if (playlist.path == file) {  // it is where it belongs
+        enterPlaylist(playlist, wanted.directory);
     } else {
         Draft draft = draftOf(playlist.path, wanted);
         import.adaptTo(draft);

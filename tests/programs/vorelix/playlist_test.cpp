@@ -207,8 +207,10 @@ TEST_F(Playlists, PersonalOnesStandInAFolder) {
     fs::create_directory(home);
     EXPECT_EQ(says({"list", "--dir", home}),
               "no playlists yet; make one: vorelix playlist create NAME ID...\n");
-    says({"create", "two", "2", "--dir", home});
+    EXPECT_EQ(answerOf({"playlist", "create", "two", "2", "--dir", home + "/"})["playlist"]["id"],
+              1);
     says({"create", "one", "1", "--dir", home});
+    EXPECT_EQ(entriesOf({home + "/playlists/two.m3u", "--dir", home + "/."}), "b");
     says({"append", "1", "3", "--dir", home});
     EXPECT_EQ(entriesOf({"one", "--dir", home}), "ac");
     const Json::Value page = answerOf({"playlist", "list", "--dir", home, "--offset", "1"});
