@@ -39,6 +39,7 @@ class App {
         }
         this.#showAccount();
         this.search = new SearchBox(this);
+        document.getElementById('player').hidden = !this.may('streaming');
         playerBar(document.getElementById('player'), this.player, () => this.shuffle());
         this.player.addEventListener('failure', ({ detail }) => this.#playerFailed(detail));
         this.player.addEventListener('change', () => this.retitle());
@@ -80,8 +81,8 @@ class App {
 
     async #show({ focus }) {
         const { name, query } = this.route;
-        const same = name === this.#shown;
-        if (!same) {
+        document.querySelectorAll('dialog').forEach((dialog) => dialog.close());
+        if (name !== this.#shown) {
             this.#view?.leave();
             this.#view = this.#make(name);
             this.#shown = name;

@@ -60,15 +60,15 @@ export class Player extends EventTarget {
         this.#tell('change');
     }
 
+    // After the current song was taken out: what follows it plays on, nothing else begins by itself.
     #reload() {
-        const wasPlaying = this.playing;
-        this.index = Math.min(this.index, this.queue.length - 1);
-        if (this.current && wasPlaying) {
+        if (this.playing && this.index < this.queue.length) {
             this.jump(this.index);
-        } else {
-            this.audio.pause();
-            this.current ? this.#load() : this.#unload();
+            return;
         }
+        this.audio.pause();
+        this.index = Math.min(this.index, this.queue.length - 1);
+        this.current ? this.#load() : this.#unload();
     }
 
     jump(index) {

@@ -39,7 +39,7 @@ export class Playlist extends View {
             { label: 'Remove from playlist', className: 'danger', run: (_, positions) => this.#remove(positions) },
             app.playAction(), app.queueAction(),
         ]);
-        this.tools.append(wordButton('play', 'Play', () => this.#play(0), 'strong'),
+        this.tools.append(...(app.may('streaming') ? [wordButton('play', 'Play', () => this.#play(0), 'strong')] : []),
             wordButton('delete', 'Delete playlist', () => this.#delete()));
         this.table = h('table', { class: 'songs entries' }, h('caption', { class: 'unseen' }), this.#head(), this.#tbody);
         this.hint = h('p', { class: 'hint', id: 'move-hint' },
@@ -121,7 +121,7 @@ export class Playlist extends View {
             return button;
         };
         const row = h('tr', {}, h('td', { class: 'box-cell' }, box),
-            playCell(entry, () => playOrPause(this.app.player, entry.stream === this.app.player.current?.stream,
+            playCell(this.app, entry, () => playOrPause(this.app.player, entry.stream === this.app.player.current?.stream,
                 () => this.#play(index))), cells(entry, kColumns),
             h('td', { class: 'move-cell' }, h('div', { class: 'moves' },
                 step('up', 'Move up:', kSteps.ArrowUp), step('down', 'Move down:', kSteps.ArrowDown),

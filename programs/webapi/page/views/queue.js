@@ -55,7 +55,7 @@ export class Queue extends View {
 
     #row(song, index) {
         const { player } = this.app;
-        return h('tr', {}, playCell(song, () => playOrPause(player, index === player.index, () => player.jump(index))),
+        return h('tr', {}, playCell(this.app, song, () => playOrPause(player, index === player.index, () => player.jump(index))),
             cells(song, kColumns), h('td', { class: 'last-cell' }, iconButton('close', `Remove ${titleOf(song)} from the queue`,
                 { onclick: () => this.#remove(song, index) })));
     }

@@ -31,9 +31,9 @@ export function cells(song, keys) {
         .map(({ className, cell }) => h('td', { class: className }, cell(song)));
 }
 
-export function playCell(song, onPlay) {
-    const button = song.stream ? iconButton('play', `Play ${titleOf(song)}`, { class: 'icon-button row-play', onclick: onPlay })
-        : null;
+export function playCell(app, song, onPlay) {
+    const button = song.stream && app.may('streaming')
+        ? iconButton('play', `Play ${titleOf(song)}`, { class: 'icon-button row-play', onclick: onPlay }) : null;
     return h('td', { class: 'play-cell' }, button);
 }
 

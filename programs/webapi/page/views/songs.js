@@ -133,7 +133,7 @@ export class Songs extends View {
 
     #nothing() {
         return this.#query.q
-            ? emptyNote('Nothing found', 'Try fewer letters, or search in everything. Case and accents do not matter.')
+            ? emptyNote('Nothing found', 'Try fewer letters, or search in all. Case and accents do not matter.')
             : emptyNote('No songs here', 'Music that is put into the music folder appears here once it is scanned.');
     }
 
@@ -142,7 +142,7 @@ export class Songs extends View {
         const play = () => playOrPause(player, song.stream === player.current?.stream, () => this.#play(index));
         const box = this.choice.box(song.id, song);
         const row = h('tr', { ondblclick: (event) => !event.target.closest('a, button, input') && this.#play(index) },
-            h('td', { class: 'box-cell' }, box), playCell(song, play), cells(song, kSortable));
+            h('td', { class: 'box-cell' }, box), playCell(this.app, song, play), cells(song, kSortable));
         return { song, row, box };
     }
 
