@@ -16,6 +16,8 @@
 #include <vorelix/records.h>
 
 #ifdef __cplusplus
+#include <vorelix/player/audiofile.h>
+#include <vorelix/player/custom_key.h>
 #include <vorelix/users/audiousers.h>
 #include <vorelix/web/actionhandler.h>
 #endif

@@ -1,13 +1,11 @@
 #include <sys/stat.h>
 #include <vorelix/config/config.h>
 
-#include <array>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <string>
 
 #include "config/line_internal.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 #include "system_paths_internal.h"
 
@@ -21,8 +19,7 @@ constexpr const char *kDefaults =
     "AS_Default_Music_PLS=\"\"\nAS_Default_IPod_PLS=\"\"\n";
 
 std::string readFile() {
-    std::ifstream file(kPath, std::ios::binary);
-    return file ? std::string(std::istreambuf_iterator<char>(file), {}) : "(no file)";
+    return files::read(kPath);
 }
 
 template <typename Call>
@@ -46,7 +43,7 @@ class Configuration : public stand_in::Test {
         fs::create_directories(ZANO_PATH_AUDIO_FOLDER);
     }
     ~Configuration() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
-    static void write(const std::string &text) { std::ofstream(kPath, std::ios::binary) << text; }
+    static void write(const std::string &text) { files::write(kPath, text); }
 };
 
 TEST(ConfigurationLine, IsTakenApart) {
@@ -183,7 +180,8 @@ TEST_F(Configuration, IsRestoredOnlyWhereThereIsNone) {
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
     EXPECT_EQ(readFile(), "");
     fs::remove(kPath);
-    std::ofstream(ZANO_PATH_AUDIO_CONF_TEMPORARY) << "left over, and longer: " << kDefaults;
+    files::write(ZANO_PATH_AUDIO_CONF_TEMPORARY,
+                 std::string("left over, and longer: ") + kDefaults);
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
     EXPECT_EQ(readFile(), kDefaults);
     EXPECT_EQ(stand_in::takeTrace(), "");

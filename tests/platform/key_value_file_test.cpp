@@ -1,17 +1,15 @@
 #include <gtest/gtest.h>
-#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 #include <zanoplatform/error.h>
 #include <zanoplatform/key_value_file.h>
 
-#include <csignal>
+#include <algorithm>
 #include <filesystem>
-#include <fstream>
-#include <iterator>
 #include <string>
 
 #include "settings/key_value_line.h"
+#include "support/files.h"
 
 namespace {
 
@@ -19,30 +17,19 @@ namespace fs = std::filesystem;
 
 constexpr const char *kFormat = "%s=\"%s\"\n";
 
-void writeFile(const std::string &path, const std::string &text) {
-    std::ofstream(path, std::ios::binary) << text;
-}
-
-std::string readFile(const std::string &path) {
-    std::ifstream file(path, std::ios::binary);
-    return {std::istreambuf_iterator<char>(file), {}};
-}
-
 class KeyValueFile : public testing::Test {
   protected:
-    KeyValueFile() { EXPECT_NE(mkdtemp(folder_.data()), nullptr); }
-    ~KeyValueFile() override { fs::remove_all(folder_); }
     int set(const std::string &key, const std::string &value) const {
         return KLIBCFileSetKeyValue(path().c_str(), key.c_str(), value.c_str(), kFormat);
     }
-    std::string path() const { return folder_ + "/a.conf"; }
+    std::string path() const { return folder_.path("a.conf"); }
     void expectNothingBeside() const {
-        for (const auto &entry : fs::directory_iterator(folder_)) {
+        for (const auto &entry : fs::directory_iterator(folder_.path(""))) {
             EXPECT_EQ(entry.path(), path());
         }
     }
 
-    std::string folder_ = testing::TempDir() + "settings_XXXXXX";
+    const files::Folder folder_;
 };
 
 TEST_F(KeyValueFile, ChangesTheLinesOfTheKeyAndNoOther) {
@@ -60,21 +47,21 @@ TEST_F(KeyValueFile, ChangesTheLinesOfTheKeyAndNoOther) {
         {"k=\"v\"\nlast", "k=\"v\"\nlast"},
     };
     for (const auto &each : cases) {
-        writeFile(path(), each.before);
+        files::write(path(), each.before);
         EXPECT_EQ(set("k", "v"), 0) << each.before;
-        EXPECT_EQ(readFile(path()), each.after) << each.before;
+        EXPECT_EQ(files::read(path()), each.after) << each.before;
         EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_NONE);
     }
     expectNothingBeside();
     EXPECT_EQ(KLIBCFileSetKeyValue(path().c_str(), "p", "50%s", "%s = %s%%\n"), -1);
     EXPECT_EQ(KLIBCFileSetKeyValue(path().c_str(), "p", "50%s", "%%%s=%s\n"), -1);
     EXPECT_EQ(KLIBCFileSetKeyValue(path().c_str(), "p", "50%s", "%s = %s\n"), 0);
-    EXPECT_EQ(readFile(path()), "k=\"v\"\nlast\np = 50%s\n");
+    EXPECT_EQ(files::read(path()), "k=\"v\"\nlast\np = 50%s\n");
 }
 
 TEST_F(KeyValueFile, MakesAFileThatIsMissingForAllToRead) {
     EXPECT_EQ(set("k", ""), 0);
-    EXPECT_EQ(readFile(path()), "k=\"\"\n");
+    EXPECT_EQ(files::read(path()), "k=\"\"\n");
     EXPECT_EQ(fs::status(path()).permissions() | fs::perms::group_read | fs::perms::others_read,
               fs::perms(0644));
     fs::permissions(path(), fs::perms(0660));
@@ -99,10 +86,10 @@ TEST_F(KeyValueFile, GivesBackEveryValueThatItTakes) {
         {std::string(1023 - 3, 'a'), false},
     };
     for (const auto &[value, isTaken] : values) {
-        writeFile(path(), "before=1\n");
+        files::write(path(), "before=1\n");
         EXPECT_EQ(set("k", value), isTaken ? 0 : -1) << value;
         EXPECT_EQ(KLIBCErrGet(), isTaken ? KLIB_ERR_NONE : KLIB_ERR_BAD_PARAMETER) << value;
-        const std::string text = readFile(path());
+        const std::string text = files::read(path());
         std::string_view rest = text;
         EXPECT_EQ(zano::settings::takeLine(rest), "before=1\n");
         EXPECT_EQ(rest.empty(), !isTaken);
@@ -113,7 +100,7 @@ TEST_F(KeyValueFile, GivesBackEveryValueThatItTakes) {
 }
 
 TEST_F(KeyValueFile, RefusesWhatWouldNotBeReadAgain) {
-    writeFile(path(), "k=1\n");
+    files::write(path(), "k=1\n");
     for (const char *key : {"", " k", "k ", "k=", "#k", "a\nk"}) {
         EXPECT_EQ(set(key, "v"), -1) << key;
         EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_PARAMETER) << key;
@@ -129,25 +116,25 @@ TEST_F(KeyValueFile, RefusesWhatWouldNotBeReadAgain) {
     EXPECT_EQ(KLIBCFileSetKeyValue(file.c_str(), "k", nullptr, kFormat), -1);
     EXPECT_EQ(KLIBCFileSetKeyValue(file.c_str(), "k", "v", nullptr), -1);
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_PARAMETER);
-    EXPECT_EQ(readFile(path()), "k=1\n");
+    EXPECT_EQ(files::read(path()), "k=1\n");
 }
 
 TEST_F(KeyValueFile, FollowsALinkAndPassesOverWhatAKilledProcessLeft) {
-    fs::create_directory(folder_ + "/real");
-    writeFile(folder_ + "/real/b.conf", "k=1\n");
+    fs::create_directory(folder_.path("real"));
+    files::write(folder_.path("real/b.conf"), "k=1\n");
     fs::create_symlink("real/b.conf", path());
-    fs::create_symlink("../victim", folder_ + "/real/b.conf.new");
+    fs::create_symlink("../victim", folder_.path("real/b.conf.new"));
     EXPECT_EQ(set("k", "2"), 0);
     EXPECT_TRUE(fs::is_symlink(path()));
-    EXPECT_EQ(readFile(folder_ + "/real/b.conf"), "k=\"2\"\n");
-    EXPECT_FALSE(fs::exists(folder_ + "/victim"));
-    EXPECT_FALSE(fs::exists(fs::symlink_status(folder_ + "/real/b.conf.new")));
+    EXPECT_EQ(files::read(folder_.path("real/b.conf")), "k=\"2\"\n");
+    EXPECT_FALSE(fs::exists(folder_.path("victim")));
+    EXPECT_FALSE(fs::exists(fs::symlink_status(folder_.path("real/b.conf.new"))));
 }
 
 TEST_F(KeyValueFile, SaysWhatCannotBeReadAndLeavesIt) {
-    EXPECT_EQ(KLIBCFileSetKeyValue((folder_ + "/none/a").c_str(), "k", "v", kFormat), -1);
+    EXPECT_EQ(KLIBCFileSetKeyValue(folder_.path("none/a").c_str(), "k", "v", kFormat), -1);
     EXPECT_EQ(KLIBCErrTextGet(),
-              "cannot open the folder " + folder_ + "/none: No such file or directory");
+              "cannot open the folder " + folder_.path("none") + ": No such file or directory");
     ASSERT_EQ(mkfifo(path().c_str(), 0644), 0);
     EXPECT_EQ(set("k", "v"), -1);
     EXPECT_STREQ(KLIBCErrTextGet(), "a.conf is not a file");
@@ -156,7 +143,7 @@ TEST_F(KeyValueFile, SaysWhatCannotBeReadAndLeavesIt) {
     EXPECT_EQ(set("k", "v"), -1);
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_FILE_FAILED);
     fs::remove(path());
-    writeFile(path(), std::string(1048577, '\n'));
+    files::write(path(), std::string(1048577, '\n'));
     EXPECT_EQ(set("k", "v"), -1);
     EXPECT_STREQ(KLIBCErrTextGet(), "a.conf is larger than 1 MiB");
     expectNothingBeside();
@@ -164,23 +151,19 @@ TEST_F(KeyValueFile, SaysWhatCannotBeReadAndLeavesIt) {
 
 TEST_F(KeyValueFile, StaysOnAFullDisk) {
     const std::string before = "k=1\n" + std::string(5000, '#') + "\n";
-    writeFile(path(), before);
-    std::signal(SIGXFSZ, SIG_IGN);
-    struct rlimit usual {};
-    getrlimit(RLIMIT_FSIZE, &usual);
-    const struct rlimit small { 4096, usual.rlim_max };
-    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &small), 0);
-    const int result = set("k", "2");
-    ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &usual), 0);
-    EXPECT_EQ(result, -1);
+    files::write(path(), before);
+    {
+        const files::FullDisk disk(4096);
+        EXPECT_EQ(set("k", "2"), -1);
+    }
     EXPECT_STREQ(KLIBCErrTextGet(), "cannot write a.conf.new: File too large");
-    EXPECT_EQ(readFile(path()), before);
+    EXPECT_EQ(files::read(path()), before);
     expectNothingBeside();
 }
 
 TEST_F(KeyValueFile, LosesNoChangeOfTwoProcessesAtOnce) {
     constexpr int kChanges = 100;
-    writeFile(path(), "# here since the beginning\n");
+    files::write(path(), "# here since the beginning\n");
     pid_t children[2];
     for (int child = 0; child < 2; ++child) {
         children[child] = fork();
@@ -197,7 +180,7 @@ TEST_F(KeyValueFile, LosesNoChangeOfTwoProcessesAtOnce) {
         ASSERT_EQ(waitpid(child, &status, 0), child);
         EXPECT_EQ(status, 0);
     }
-    const std::string text = readFile(path());
+    const std::string text = files::read(path());
     EXPECT_TRUE(text.starts_with("# here since the beginning\n"));
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 2 * kChanges + 1);
     for (int change = 0; change < kChanges; ++change) {
