@@ -10,6 +10,7 @@ add_library(vorelix SHARED
     $<TARGET_OBJECTS:vorelix_misc>
     $<TARGET_OBJECTS:vorelix_library>
     $<TARGET_OBJECTS:vorelix_playlists>
+    $<TARGET_OBJECTS:vorelix_ipod>
     $<TARGET_OBJECTS:vorelix_player>
     $<TARGET_OBJECTS:vorelix_config>
     $<TARGET_OBJECTS:vorelix_users>

@@ -10,6 +10,7 @@
 #define VORELIX_H
 
 #include <vorelix/config/config.h>
+#include <vorelix/ipod/ipod.h>
 #include <vorelix/library/musiclib.h>
 #include <vorelix/misc/misc.h>
 #include <vorelix/playlists/playlist.h>
