@@ -14,13 +14,14 @@ add_library(vorelix SHARED
     $<TARGET_OBJECTS:vorelix_player>
     $<TARGET_OBJECTS:vorelix_config>
     $<TARGET_OBJECTS:vorelix_users>
-    $<TARGET_OBJECTS:vorelix_web>)
+    $<TARGET_OBJECTS:vorelix_web>
+    $<TARGET_OBJECTS:vorelix_upnp>)
 add_library(vorelix::vorelix ALIAS vorelix)
 # Public, for callers release the lists that they get with a function of the platform, and some
 # hand over JSON values.
 target_link_libraries(vorelix
     PUBLIC vorelix::zanoplatform JsonCpp::JsonCpp
-    PRIVATE vorelix_rules)
+    PRIVATE vorelix_rules PkgConfig::libxml2)
 target_include_directories(vorelix INTERFACE
     $<BUILD_INTERFACE:${PROJECT_BINARY_DIR}/include>
     $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)

@@ -19,6 +19,8 @@
 #ifdef __cplusplus
 #include <vorelix/player/audiofile.h>
 #include <vorelix/player/custom_key.h>
+#include <vorelix/upnp/dmagent.h>
+#include <vorelix/upnp/dmaparser.h>
 #include <vorelix/users/audiousers.h>
 #include <vorelix/web/actionhandler.h>
 #endif

@@ -30,6 +30,6 @@ check 'sqlite3(ext)?\.h' 'platform/mediadb/sqlite/'
 check 'taglib/.*|fileref\.h|tag\.h' 'programs/zanoindex/'
 check 'utf8proc\.h' 'platform/text/|programs/playlists/text\.cpp:'
 check '(postgresql/)?libpq(-fe|/.*)?\.h' 'platform/mediadb/postgresql/' 'not yet'
-check 'curl/.*' 'upnp/' 'not yet'
-check 'libxml/.*' 'upnp/' 'not yet'
+check 'curl/.*' 'upnp/'
+check 'libxml/.*' 'upnp/'
 exit $status
