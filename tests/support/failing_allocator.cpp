@@ -37,10 +37,12 @@ extern "C" {
 
 void *realMalloc(std::size_t size) __asm__("__real_malloc");
 void *realCalloc(std::size_t count, std::size_t size) __asm__("__real_calloc");
+void *realRealloc(void *block, std::size_t size) __asm__("__real_realloc");
 // Visible, for the linker takes the shared libraries' calls for calls of these.
 #define EXPORTED __attribute__((visibility("default")))
 EXPORTED void *wrappedMalloc(std::size_t size) __asm__("__wrap_malloc");
 EXPORTED void *wrappedCalloc(std::size_t count, std::size_t size) __asm__("__wrap_calloc");
+EXPORTED void *wrappedRealloc(void *block, std::size_t size) __asm__("__wrap_realloc");
 
 void *wrappedMalloc(std::size_t size) {
     return fails(size) ? nullptr : realMalloc(size);
@@ -48,6 +50,10 @@ void *wrappedMalloc(std::size_t size) {
 
 void *wrappedCalloc(std::size_t count, std::size_t size) {
     return fails(count * size) ? nullptr : realCalloc(count, size);
+}
+
+void *wrappedRealloc(void *block, std::size_t size) {
+    return fails(size) ? nullptr : realRealloc(block, size);
 }
 
 }  // extern "C"

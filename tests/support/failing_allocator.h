@@ -1,7 +1,8 @@
 /* Lets one allocation of the code under test fail.
  *
- * For a program that links the objects under test itself, with -Wl,--wrap=malloc,--wrap=calloc:
- * their calls then arrive here and pass on to the real ones, so that leaks are still seen. */
+ * For a program that links the objects under test itself, with
+ * -Wl,--wrap=malloc,--wrap=calloc,--wrap=realloc: their calls then arrive here and pass on to the
+ * real ones, so that leaks are still seen. */
 #pragma once
 
 #include <cstddef>

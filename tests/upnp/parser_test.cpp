@@ -1,0 +1,231 @@
+#include <gtest/gtest.h>
+#include <sys/inotify.h>
+#include <unistd.h>
+#include <vorelix/upnp/dmaparser.h>
+
+#include <filesystem>
+#include <fstream>
+
+#include "support/http_server.h"
+
+namespace {
+
+void release(ItemList *list) {
+    for (ItemNode *const node : *list) {
+        if (node->children != nullptr) {
+            ItemList *const children = node->children;
+            node->children = nullptr;
+            release(children);
+        }
+        delete node;
+    }
+    delete list;
+}
+
+/* Also releases what the parser made, as its callers do. */
+class Parser : public DMAParser {
+  public:
+    ~Parser() override {
+        release(containers);
+        release(items);
+    }
+    int parse(const std::string &text) { return Parse(text.data(), static_cast<int>(text.size())); }
+};
+
+/* What the library prints of both lists. */
+std::string dump(const Parser &parser) {
+    testing::internal::CaptureStdout();
+    parser.containers->PrintContent();
+    std::string text = testing::internal::GetCapturedStdout();
+    testing::internal::CaptureStdout();
+    parser.items->PrintContent();
+    return text + "--\n" + testing::internal::GetCapturedStdout();
+}
+
+std::string dumpOf(const std::string &text) {
+    Parser parser;
+    EXPECT_EQ(parser.parse(text), 0) << text.substr(0, 300);
+    return dump(parser);
+}
+
+/* As a server sends it and an agent decodes it. */
+std::string answer(const std::string &didl, const std::string &counts = "") {
+    return "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n<s:Envelope "
+           "xmlns:s=\"http://schemas.xmlsoap.org/soap/envelope/\"><s:Body>"
+           "<u:BrowseResponse xmlns:u=\"urn:schemas-upnp-org:service:ContentDirectory:1\"><Result>"
+           "<DIDL-Lite xmlns:dc=\"urn:d\" xmlns:upnp=\"urn:u\" xmlns=\"urn:n\">\n" +
+           didl + "\n</DIDL-Lite></Result>" + counts +
+           "<UpdateID>7</UpdateID></u:BrowseResponse></s:Body></s:Envelope>";
+}
+
+TEST(Parser, MakesMapsOfContainersItemsAndResources) {
+    const std::string text = answer(
+        "<container id=\"64\" parentID=\"0\" childCount=\"\"><dc:title>All &amp; more</dc:title>"
+        "<container id=\"inner\"/></container>\n<item id=\"1\" parentID=\"64\" restricted=\"1\"> x"
+        "<dc:title>One</dc:title><!-- c --><dc:creator/><upnp:artist role=\"a\">A</upnp:artist>"
+        "<upnp:artist role=\"b\">B</upnp:artist><id>other</id><empty><b>t</b></empty>"
+        "<res protocolInfo=\"p\" size=\"5\">http://a/1.mp3</res>"
+        "<res size=\"6\" res=\"attribute\">http://a/1.wav<res duration=\"1\"/></res>"
+        "<container id=\"unseen\"/></item><other><item id=\"2\"/></other>");
+    EXPECT_EQ(dumpOf(text),
+              "[0]:\n0: childCount=  \n1: container=  \n2: id=64  \n3: parentID=0  \n"
+              "4: title=All & more  \n\n"
+              "--\n"
+              "[0]:\n0: artist=A  \n1: container=  \n2: creator=  \n3: empty=  \n4: id=1  \n"
+              "5: parentID=64  \n6: restricted=1  \n7: title=One  \n-- child item --\n"
+              "[0]:\n0: protocolInfo=p  \n1: res=http://a/1.mp3  \n2: size=5  \n\n"
+              "[1]:\n0: res=http://a/1.wav  \n1: size=6  \n-- child item --\n"
+              "[0]:\n0: duration=1  \n\n\n\n"
+              "[1]:\n0: id=2  \n\n");
+}
+
+TEST(Parser, FindsValuesInANodeAndThenInItsResources) {
+    Parser parser;
+    ASSERT_EQ(parser.parse(answer("<item id=\"1\"><dc:creator/><res size=\"\" creator=\"c\">first"
+                                  "</res><res size=\"7\" bitrate=\"8\">second</res></item>")),
+              0);
+    ItemNode &item = *parser.items->front();
+    const std::pair<const char *, const char *> cases[] = {
+        {"id", "1"},      {"creator", ""}, {"res", "first"}, {"size", "7"},
+        {"bitrate", "8"}, {"none", ""},    {"", ""},
+    };
+    for (const auto &[key, value] : cases) {
+        EXPECT_EQ(item.getValueByKey(key), value) << key;
+    }
+    EXPECT_EQ(ItemNode().getValueByKey("id"), "");
+}
+
+TEST(Parser, KeepsTheLaterOfTheTwoCounts) {
+    const std::tuple<const char *, int> cases[] = {
+        {"<NumberReturned>3</NumberReturned><TotalMatches>10</TotalMatches>", 10},
+        {"<TotalMatches>10</TotalMatches><NumberReturned>3</NumberReturned>", 3},
+        {"<TotalMatches>10</TotalMatches><NumberReturned/>", 10},
+        {"<TotalMatches>10</TotalMatches><NumberReturned><b>3</b></NumberReturned>", 0},
+        {"<TotalMatches> -4x</TotalMatches>", -4},
+        {"<TotalMatches>many</TotalMatches>", 0},
+        {"<TotalMatches>99999999999</TotalMatches>", 2147483647},
+        {"", 0},
+    };
+    Parser parser;
+    for (const auto &[counts, total] : cases) {
+        parser.numberReturned = 9;
+        ASSERT_EQ(parser.parse(answer("", counts)), 0) << counts;
+        EXPECT_EQ(parser.totalMatches, total) << counts;
+        EXPECT_EQ(parser.numberReturned, 0) << counts;
+    }
+}
+
+TEST(Parser, AddsToItsListsAndLeavesThemAloneWhenThereIsNoDocument) {
+    Parser parser;
+    ASSERT_EQ(parser.parse(answer("<item id=\"1\"/>", "<TotalMatches>1</TotalMatches>")), 0);
+    std::string nested;
+    for (int i = 0; i < 300; ++i) {
+        nested = "<a>" + nested + "</a>";
+    }
+    testing::internal::CaptureStderr();
+    for (const std::string &bad :
+         {std::string(), std::string("no XML"), answer("<item>R & B</item>"),
+          answer("<item id=\"2\">"), answer("<item id=\"2\"/>\xE9\xFF"),
+          answer("<item id=\"2\"/>\x01"), answer(nested),
+          answer("<item id=\"2\"/><?xml version=\"1.0\"?>"), std::string("<!DOCTYPE a>")}) {
+        EXPECT_EQ(parser.parse(bad), -1) << bad.substr(0, 500);
+    }
+    EXPECT_EQ(parser.Parse(nullptr, 0), -1);
+    EXPECT_EQ(parser.Parse(nullptr, 5), -1);
+    EXPECT_EQ(parser.Parse("<item id=\"2\"/>", -1), -1);
+    EXPECT_NE(testing::internal::GetCapturedStderr(), "") << "libxml2 says why";
+    EXPECT_EQ(parser.totalMatches, 1);
+    ASSERT_EQ(parser.parse("<item id=\"3\"/>"), 0);
+    EXPECT_EQ(dump(parser), "--\n[0]:\n0: id=1  \n\n[1]:\n0: id=3  \n\n");
+}
+
+TEST(Parser, ReadsTheResponseOfABrowse) {
+    DMABrowse browse(DMAGENT_BROWSE_METADATA, "");
+    Parser parser;
+    EXPECT_EQ(parser.Parse(&browse), -1);
+    // Decoded in place: behind the end of the text stand bytes of the longer one that was there.
+    char text[] = "<Result>&lt;item id=&quot;1&quot;/&gt;&lt;item/&gt;</Result>\n";
+    browse.response = text;
+    browse.responseSize = sizeof text - 1;
+    browse.DecodeRDataHTML();
+    EXPECT_EQ(parser.Parse(&browse), 0);
+    EXPECT_EQ(dump(parser), "--\n[0]:\n0: id=1  \n\n[1]:\n\n");
+}
+
+TEST(Parser, LooksIntoNoEntity) {
+    std::string bomb = "<!DOCTYPE a [<!ENTITY e0 \"&#60;item id='e'/&#62;\">";
+    for (int i = 1; i < 20; ++i) {
+        bomb += "<!ENTITY e" + std::to_string(i) + " \"";
+        for (int k = 0; k < 10; ++k) {
+            bomb += "&e" + std::to_string(i - 1) + ";";
+        }
+        bomb += "\">";
+    }
+    EXPECT_EQ(dumpOf(bomb + "]><a>&e1;<item id=\"1\">&e1;</item></a>"), "--\n[0]:\n0: id=1  \n\n");
+    testing::internal::CaptureStderr();
+    Parser parser;
+    parser.parse(bomb + "]><a>&e19;<item id=\"&e19;\"/></a>");
+    parser.parse("<!DOCTYPE a [<!ENTITY a \"&b;\"><!ENTITY b \"&a;\">]><a>&a;<item>&b;</item></a>");
+    EXPECT_LE(parser.items->size(), 2U);
+    testing::internal::GetCapturedStderr();
+}
+
+TEST(Parser, FetchesNothingAndOpensNoFile) {
+    const http_server::Server server(http_server::reply("<item id=\"fetched\"/>"));
+    const std::string file = testing::TempDir() + "upnp_entity_" + std::to_string(getpid());
+    std::ofstream(file) << "<item id=\"read\"/>";
+    const int watch = inotify_init1(IN_NONBLOCK);
+    inotify_add_watch(watch, file.c_str(), IN_OPEN | IN_ACCESS);
+    testing::internal::CaptureStderr();
+    for (const std::string &uri : {server.url("/x.dtd"), "file://" + file, file}) {
+        for (const std::string &type :
+             {"a SYSTEM \"" + uri + "\"", "a [<!ENTITY e SYSTEM \"" + uri + "\">]",
+              "a [<!ENTITY % e SYSTEM \"" + uri + "\"> %e;]"}) {
+            Parser parser;
+            parser.parse("<!DOCTYPE " + type +
+                         "><a xmlns:xi=\"http://www.w3.org/2001/XInclude\"><xi:include href=\"" +
+                         uri + "\"/><item id=\"1\"><t>&e;</t></item></a>");
+            const std::string found = dump(parser);
+            EXPECT_EQ(found.find("read"), std::string::npos) << type;
+            EXPECT_EQ(found.find("fetched"), std::string::npos) << type;
+        }
+    }
+    testing::internal::GetCapturedStderr();
+    char event[4096];
+    EXPECT_EQ(read(watch, event, sizeof event), -1) << "the file was opened";
+    EXPECT_TRUE(server.requests().empty());
+    close(watch);
+    std::filesystem::remove(file);
+}
+
+TEST(Parser, TakesDeepAndLargeAnswers) {
+    std::string nested = "<item id=\"deep\"><res>1";
+    std::string open;
+    std::string close;
+    for (int i = 0; i < 100; ++i) {
+        nested += "<res>2";
+        open += "<a>";
+        close += "</a>";
+    }
+    for (int i = 0; i < 100; ++i) {
+        nested += "</res>";
+    }
+    EXPECT_EQ(dumpOf(open + "<item id=\"deep\"/>" + close), "--\n[0]:\n0: id=deep  \n\n");
+    Parser parser;
+    ASSERT_EQ(parser.parse(nested + "</res></item>"), 0);
+    int depth = 0;
+    for (const ItemNode *node = parser.items->front(); node->children != nullptr; ++depth) {
+        node = node->children->front();
+    }
+    EXPECT_EQ(depth, 101);
+
+    const std::string large(9900000, 'x');
+    ASSERT_EQ(parser.parse(answer("<item title=\"" + large + "\"/>")), 0);
+    EXPECT_EQ(parser.items->back()->getValueByKey("title"), large);
+    testing::internal::CaptureStderr();
+    EXPECT_EQ(parser.parse(answer("<item title=\"" + large + large + "\"/>")), -1);
+    testing::internal::GetCapturedStderr();
+    EXPECT_EQ(parser.items->size(), 2U);
+}
+
+}  // namespace

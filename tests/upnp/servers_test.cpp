@@ -1,0 +1,118 @@
+/* What servers do that they should not. */
+#include <gtest/gtest.h>
+#include <poll.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <functional>
+
+#include "agents.h"
+#include "support/http_server.h"
+
+namespace {
+
+using http_server::Reply;
+using http_server::reply;
+using http_server::Server;
+using http_server::Then;
+using upnp_test::takeResponse;
+
+TEST(Servers, GiveWhateverTheyGive) {
+    const std::string gzip("\x1F\x8B\x08\0 &packed", 12);
+    const Server elsewhere(reply("elsewhere"));
+    struct {
+        const char *name;
+        Reply reply;
+        int result;
+        unsigned size;
+        const char *response;
+    } cases[] = {
+        {"empty body", reply(""), 0, 0, "(null)"},
+        {"no word", {""}, 52, 0, "(null)"},
+        {"no HTTP", {"hello\r\n\r\n"}, 1, 0, "(null)"},
+        {"closed in mid-body", {"HTTP/1.1 200 OK\r\nContent-Length: 90\r\n\r\n&lt;a"}, 18, 5, "<a"},
+        {"longer than it says",
+         {"HTTP/1.1 200 OK\r\nContent-Length: 3\r\n\r\nabcdef"},
+         0,
+         3,
+         "abc"},
+        {"length of letters", {"HTTP/1.1 200 OK\r\nContent-Length: x\r\n\r\nabc"}, 8, 0, "(null)"},
+        {"broken chunk",
+         {"HTTP/1.1 200 OK\r\nTransfer-Encoding: chunked\r\n\r\n3\r\nabc\r\nq\r\n"},
+         56,
+         3,
+         "abc"},
+        {"error status", reply("<a>&lt;fault&gt;</a>", "500 Internal Server Error"), 0, 20,
+         "<a><fault></a>"},
+        {"not found", reply("gone", "404 Not Found"), 0, 4, "gone"},
+        {"redirect", reply("moved", "302 Found", "Location: " + elsewhere.url() + "\r\n"), 0, 5,
+         "moved"},
+        {"gzip unasked", reply(gzip, "200 OK", "Content-Encoding: gzip\r\n"), 0, 12,
+         "\x1F\x8B\x08"},
+    };
+    for (const auto &row : cases) {
+        SCOPED_TRACE(row.name);
+        const Server server(row.reply);
+        DMABrowse browse(DMAGENT_BROWSE_METADATA, server.url());
+        EXPECT_EQ(browse.Perform(), row.result);
+        EXPECT_EQ(browse.responseSize, row.size);
+        EXPECT_EQ(takeResponse(browse), row.response);
+    }
+    EXPECT_TRUE(elsewhere.requests().empty());
+}
+
+TEST(Servers, MayNotBeThere) {
+    std::string closed;
+    {
+        const Server server(reply(""));
+        closed = server.url();
+    }
+    const std::pair<std::string, int> cases[] = {
+        {closed, 7}, {"", 3}, {"no-such-scheme://x/", 1}, {"http://", 3}};
+    for (const auto &[url, result] : cases) {
+        DMABrowse browse(DMAGENT_BROWSE_METADATA, url);
+        EXPECT_EQ(browse.Perform(), result) << url;
+        EXPECT_EQ(takeResponse(browse), "(null)") << url;
+    }
+}
+
+/* True when a request to the server is still under way after `isDue` has come true. */
+bool isUnderWay(const Server &server, const std::function<bool()> &isDue) {
+    const pid_t child = fork();
+    if (child == 0) {
+        DMABrowse(DMAGENT_BROWSE_METADATA, server.url()).Perform();
+        _exit(0);
+    }
+    const auto handle = static_cast<int>(syscall(SYS_pidfd_open, child, 0));
+    pollfd end{handle, POLLIN, 0};
+    constexpr int kPatience = 3000;  // tens of milliseconds
+    for (int i = 0; i < kPatience && !isDue() && poll(&end, 1, 10) == 0; ++i) {
+    }
+    EXPECT_TRUE(isDue());
+    poll(&end, 1, 50);
+    kill(child, SIGKILL);
+    int status = 0;
+    waitpid(child, &status, 0);
+    close(handle);
+    return WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL;
+}
+
+TEST(Servers, AreWaitedForWithoutALimit) {
+    constexpr unsigned long kMuch = 4UL << 20;
+    const Reply never[] = {{"", Then::Wait},
+                           {"HTTP/1.1 200 OK\r\nContent-Length: 9\r\n\r\nabc", Then::Wait},
+                           reply("R &#38; B")};
+    for (const Reply &row : never) {
+        const Server server(row);
+        EXPECT_TRUE(isUnderWay(server, [&] {
+            return !server.requests().empty() && server.sent() == row.bytes.size();
+        })) << row.bytes;
+    }
+    const Server endless(
+        Reply{"HTTP/1.0 200 OK\r\n\r\n" + std::string(1 << 20, 'x'), Then::Repeat});
+    EXPECT_TRUE(isUnderWay(endless, [&] { return endless.sent() > kMuch; }));
+}
+
+}  // namespace
