@@ -8,20 +8,21 @@ const kPatienceMs = 20_000;
 export const base = process.env.VORELIX_URL;
 
 let started;
-async function browser() {
+async function start() {
+    await becomes(async () => (await fetch(base).catch(() => ({ ok: false }))).ok, true);
     // The sandbox of Chromium does not start for root, who runs tests in containers.
-    started ??= chromium.launch({
+    return chromium.launch({
         executablePath: process.env.VORELIX_CHROMIUM, chromiumSandbox: process.getuid() !== 0,
         args: ['--mute-audio', '--autoplay-policy=no-user-gesture-required'],
     });
-    return started;
 }
 after(async () => (await started)?.close());
 
 // Runs `work(page)` on a page of its own, of which nothing may complain: no error on the console, none that
 // a script did not catch, no dialog of a script. `expected` fits complaints that the test causes.
 export async function withPage(work, { fragment = '', expected = /^$/, prepare = () => {}, ...options } = {}) {
-    const context = await (await browser()).newContext({ viewport: { width: 1280, height: 800 }, ...options });
+    started ??= start();
+    const context = await (await started).newContext({ viewport: { width: 1280, height: 800 }, ...options });
     context.setDefaultTimeout(kPatienceMs);
     const page = await context.newPage();
     const complaints = [];

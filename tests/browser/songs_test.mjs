@@ -6,7 +6,9 @@ const kBeyonce = ['Café', 'Crème Brûlée', 'Halfway to Noon', 'She Said "Hell
 const range = (page) => page.locator('.range').textContent();
 const heading = (page) => page.locator('h1').textContent();
 const focused = (page) => page.evaluate(() => document.activeElement.tagName);
-const cells = (page, column) => page.locator(`table.songs tbody td:nth-child(${column})`).allTextContents();
+// The texts of a column, with one hyphen for those that sort as one.
+const cells = (page, column) => page.locator(`table.songs tbody td:nth-child(${column})`).evaluateAll((all) => all
+    .map((cell) => (cell.firstElementChild ?? cell).textContent.replace(/[‐–]/g, '-')));
 
 test('SearchFindsAsYouTypeInOneRequest', () => withPage(async (page) => {
     const asked = [];
@@ -54,7 +56,7 @@ test('ColumnsSortBothWays', () => withPage(async (page) => {
         await header.getByRole('button').click();
         await becomes(way, first === 'ascending' ? 'descending' : 'ascending');
         await settled(page);
-        await becomes(async () => (await cells(page, column)).reverse().join('|'), there.join('|'));
+        await becomes(async () => (await cells(page, column)).reverse(), there);
         assert.notEqual(there[0], there.at(-1), name);
         assert.equal(await page.locator('th[aria-sort]').count(), 1);
     }
