@@ -11,6 +11,7 @@
 #include <tuple>
 
 #include "engine.h"
+#include "postgresql/engine.h"
 #include "query/parse.h"
 #include "sqlite/engine.h"
 #include "strings/error_internal.h"
@@ -27,6 +28,7 @@ struct EngineKind {
 
 constexpr std::array kEngines = {
     EngineKind{"sqlite:", sqlite::makeEngine, sqlite::openCatalogue},
+    EngineKind{"postgresql:", postgresql::makeEngine, postgresql::openCatalogue},
 };
 
 /* The engine that a location names, and the location without the engine's name. */
@@ -37,7 +39,9 @@ std::pair<const EngineKind *, std::string> engineOf(const std::string &location)
         }
     }
     throw DatabaseError(KLIB_ERR_BAD_CONFIGURATION,
-                        "the setting mediadb is not \"sqlite:\" and an absolute path: " + location);
+                        "the setting mediadb is neither \"sqlite:\" and an absolute path nor a "
+                        "\"postgresql://\" address: " +
+                            location);
 }
 
 /* The engine of the current settings. They are looked at again when their file changes, so that

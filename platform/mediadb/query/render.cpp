@@ -51,7 +51,51 @@ std::optional<std::string> jsonArray(std::span<const Expression> items) {
     return json.append("]");
 }
 
+/* '{"a","b"}', which engines with arrays read; of paths the bytes, of integers the digits. */
+std::string arrayText(std::span<const Expression> items, bool isPaths) {
+    std::string array;
+    for (const Expression &item : items) {
+        array.push_back(array.empty() ? '{' : ',');
+        const auto *text = std::get_if<std::string>(&item.value);
+        if (text == nullptr) {
+            array.append(std::to_string(std::get<std::int64_t>(item.value)));
+        } else if (isPaths) {
+            appendPathElement(array, *text);
+        } else {
+            appendTextElement(array, *text);
+        }
+    }
+    return array.append("}");
+}
+
+bool isPath(const Expression &expression) {
+    return expression.kind == Expression::Kind::Column && expression.column == Column::Path;
+}
+
+bool isNumber(const Expression &expression) {
+    return (expression.kind == Expression::Kind::Column && !columnInfo(expression.column).isText) ||
+           (expression.kind == Expression::Kind::Call && expression.function == "length");
+}
+
 }  // namespace
+
+void appendTextElement(std::string &array, std::string_view text) {
+    array.push_back('"');
+    for (const char c : text) {
+        array.append(c == '"' || c == '\\' ? "\\" : "").push_back(c);
+    }
+    array.push_back('"');
+}
+
+void appendPathElement(std::string &array, std::string_view path) {
+    constexpr std::string_view kDigits = "0123456789abcdef";
+    array.append("\"\\\\x");
+    for (const char c : path) {
+        array.push_back(kDigits[static_cast<unsigned char>(c) >> 4]);
+        array.push_back(kDigits[c & 0xF]);
+    }
+    array.push_back('"');
+}
 
 std::string_view orderColumn(Column column) {
     const ColumnInfo &info = columnInfo(column);
@@ -64,7 +108,39 @@ Sql &Sql::bind(Value value) {
     if (dialect_->parametersAreNumbered) {
         text_.append(std::to_string(values_.size()));
     }
+    if (std::holds_alternative<std::int64_t>(values_.back())) {
+        text_.append(dialect_->integerCast);
+    } else if (std::holds_alternative<double>(values_.back())) {
+        text_.append(dialect_->realCast);
+    }
     return *this;
+}
+
+/* A column or call as a text. */
+void Sql::addText(const Expression &expression, std::string_view qualifier) {
+    const bool isPathOfBytes = isPath(expression) && !dialect_->pathText.empty();
+    if (isPathOfBytes) {
+        add(dialect_->pathText).add("(");
+    }
+    addCondition(expression, qualifier);
+    add(isPathOfBytes ? ")" : "");
+    add(isNumber(expression) ? dialect_->textCast : "");
+}
+
+/* The folded key of a text. */
+void Sql::addKey(const Expression &expression, std::string_view qualifier) {
+    const bool isColumn = expression.kind == Expression::Kind::Column;
+    if (isColumn && !columnInfo(expression.column).key.empty()) {
+        add(qualifier).add(columnInfo(expression.column).key);
+    } else if (isColumn && dialect_->allTextsHaveKeys && !isNumber(expression)) {
+        add(qualifier).add(columnInfo(expression.column).name).add("_key");
+    } else if (isNumber(expression) && !dialect_->textCast.empty()) {
+        addText(expression, qualifier);
+    } else {
+        add(dialect_->fold).add("(");
+        addText(expression, qualifier);
+        add(")");
+    }
 }
 
 void Sql::addOrder(const std::vector<OrderTerm> &order, std::string_view qualifier) {
@@ -96,7 +172,7 @@ void Sql::addCondition(const Expression &expression, std::string_view qualifier)
             break;
         case Kind::Call:
             add(expression.function == "lower" ? dialect_->lower : dialect_->length).add("(");
-            addCondition(expression.parts[0], qualifier);
+            addText(expression.parts[0], qualifier);
             add(")");
             break;
         case Kind::Not:
@@ -170,9 +246,27 @@ void Sql::addCompare(const Expression &expression, std::string_view qualifier) {
     add(")");
 }
 
+/* The list as one array; false when its values are of several kinds. */
+bool Sql::addInArray(const Expression &expression) {
+    const std::span items(expression.parts.begin() + 1, expression.parts.end());
+    const size_t kind = items.front().value.index();
+    const bool isOfOneKind = std::all_of(items.begin(), items.end(), [&](const Expression &item) {
+        return item.value.index() == kind && !std::holds_alternative<double>(item.value);
+    });
+    if (isOfOneKind) {
+        const bool isIntegers = std::holds_alternative<std::int64_t>(items.front().value);
+        add("=ANY(").bind(arrayText(items, isPath(expression.parts[0])));
+        add(isIntegers ? dialect_->integerArrayCast : "").add(")");
+    }
+    return isOfOneKind;
+}
+
 /* Many values are one array, so that statements for lists of any length are one statement. */
 void Sql::addIn(const Expression &expression, std::string_view qualifier) {
     addCondition(expression.parts[0], qualifier);
+    if (!dialect_->integerArrayCast.empty() && addInArray(expression)) {
+        return;
+    }
     const auto items = expression.parts.begin() + 1;
     auto array = dialect_->listOfValues.empty()
                      ? std::nullopt
@@ -197,14 +291,15 @@ void Sql::addLike(const Expression &expression, std::string_view qualifier) {
         add("1=1");
         return;
     }
-    const bool isColumn = subject.kind == Expression::Kind::Column;
+    /* Bytes are matched as they are; but one character of a path may be several. */
+    const bool hasCharacters = std::any_of(
+        pattern.pieces().begin(), pattern.pieces().end(),
+        [](const auto &piece) { return piece.kind == Pattern::Piece::Kind::AnyCharacter; });
     const auto addSubject = [&] {
-        if (expression.ignoreCase && isColumn && !columnInfo(subject.column).key.empty()) {
-            add(qualifier).add(columnInfo(subject.column).key);
-        } else if (expression.ignoreCase) {
-            add(dialect_->fold).add("(");
-            addCondition(subject, qualifier);
-            add(")");
+        if (expression.ignoreCase) {
+            addKey(subject, qualifier);
+        } else if (hasCharacters || isNumber(subject)) {
+            addText(subject, qualifier);
         } else {
             addCondition(subject, qualifier);
         }
@@ -212,19 +307,19 @@ void Sql::addLike(const Expression &expression, std::string_view qualifier) {
     if (const auto text = pattern.exact()) {
         addSubject();
         add("=").bind(std::string(*text));
-    } else if (const auto part = pattern.part(); part && expression.ignoreCase) {
+    } else if (const auto part = pattern.part();
+               part && expression.ignoreCase && !dialect_->position.empty()) {
         add(dialect_->position).add("(");
         addSubject();
         add(",").bind(std::string(*part)).add(")>0");
-    } else if (isColumn && subject.column == Column::Path && pattern.prefix() &&
-               !expression.ignoreCase) {
+    } else if (isPath(subject) && pattern.prefix() && !expression.ignoreCase) {
         addPathRange(*pattern.prefix(), qualifier);
     } else {
         const bool isFunction = !dialect_->like.empty();
         add(dialect_->like).add(isFunction ? "(" : "");
         addSubject();
         add(isFunction ? "," : " LIKE ").bind(pattern.likeText());
-        add(isFunction ? ")" : " ESCAPE '\\'");
+        add(isFunction ? ")" : "");
     }
 }
 

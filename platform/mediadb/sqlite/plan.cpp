@@ -31,7 +31,9 @@ Sql newSql(std::string_view text) {
 const Dialect &dialect() {
     static constexpr Dialect kDialect{
         '?',          false,    "instr",     "zano_fold",
-        "zano_lower", "length", "zano_like", "SELECT value FROM json_each"};
+        "zano_lower", "length", "zano_like", "SELECT value FROM json_each",
+        "",           "",       "",          "",
+        "",           false};
     return kDialect;
 }
 

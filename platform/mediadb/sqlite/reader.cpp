@@ -1,15 +1,13 @@
 #include "reader.h"
 
-#include <pthread.h>
 #include <sys/stat.h>
 #include <zanoplatform/error.h>
 
 #include <algorithm>
-#include <atomic>
-#include <new>
 #include <utility>
 
 #include "../engine.h"
+#include "../forks.h"
 #include "schema.h"
 
 namespace zano::mediadb::sqlite {
@@ -144,16 +142,6 @@ ReaderPool::ReaderPool(std::string path) : path_(std::move(path)), forks_(forksS
 
 ReaderPool::~ReaderPool() {
     forgetOthers();
-}
-
-/* Counted by the C library at each fork, since asking for the process costs a system call. */
-unsigned ReaderPool::forksSoFar() {
-    static std::atomic<unsigned> forks{0};
-    static const int registered = pthread_atfork(nullptr, nullptr, [] { ++forks; });
-    if (registered != 0) {
-        throw std::bad_alloc();
-    }
-    return forks;
 }
 
 /* Connections must not be used in a process that was forked off, not even to close them. */

@@ -18,6 +18,7 @@
 #include <utility>
 #include <vector>
 
+#include "../forks.h"
 #include "../query/render.h"
 #include "handle.h"
 
@@ -108,8 +109,6 @@ class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
     Lease lease();
 
   private:
-    /* How many forks lie between this process and the one that loaded the library. */
-    static unsigned forksSoFar();
     void forgetOthers();
     void giveBack(std::unique_ptr<Reader> reader) noexcept;
 

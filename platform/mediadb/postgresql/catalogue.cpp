@@ -1,0 +1,396 @@
+#include <zanoplatform/error.h>
+
+#include <cstdlib>
+#include <unordered_map>
+#include <utility>
+
+#include "engine.h"
+#include "plan.h"
+#include "songs.h"
+#include "text/fold.h"
+
+namespace zano::mediadb::postgresql {
+namespace {
+
+/* Songs are sent in pieces of this number, since a question for each would take most of the time.
+ */
+constexpr size_t kSongsAtOnce = 1000;
+/* The planner's numbers are made anew when a fifth of the songs has come or gone. */
+constexpr std::int64_t kRecountShare = 5;
+/* Held by who sets anchors; any number that all programs of this kind use. */
+constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
+constexpr const char *kUnlockAnchors = "SELECT pg_advisory_unlock(1517118562, 2)";
+constexpr const char *kSnapshot = "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ";
+
+/* Several programs write at once: the rows of their songs are their own, and the rows that all of
+ * them write, facets and state, are written last and in one order. */
+class PostgresqlCatalogue : public Catalogue {
+  public:
+    explicit PostgresqlCatalogue(const std::string &uri) : connection_(openForWriting(uri)) {}
+    ~PostgresqlCatalogue() override { PostgresqlCatalogue::rollback(); }
+
+    /* The range ends at "folder0", '0' being the character behind '/'. It comes from the index in
+     * order, and holds a few neighbours such as "folder-b", which are passed over. */
+    void forEachFile(const std::string &folder, const FileCallback &callback) override {
+        const bool isAll = folder.empty();
+        Sql sql = newSql(
+            "DECLARE files NO SCROLL CURSOR FOR SELECT path, size, modified, changed FROM songs");
+        if (!isAll) {
+            sql.add(" WHERE path>=").bind(folder).add(" AND path<").bind(folder + "0");
+        }
+        sql.add(" ORDER BY path");
+        const bool isOwn = !isOpen_;
+        if (isOwn) {
+            open("BEGIN");
+        }
+        try {
+            connection_.run(sql);
+            for (Result rows = nextFiles(); rows.size() > 0; rows = nextFiles()) {
+                for (int i = 0; i < rows.size(); ++i) {
+                    const std::string_view path = rows[i].text(0);
+                    if (isAll || path.size() == folder.size() || path[folder.size()] == '/') {
+                        callback(path,
+                                 {rows[i].integer(1), rows[i].integer(2), rows[i].integer(3)});
+                    }
+                }
+            }
+            connection_.run(std::string("CLOSE files"));
+        } catch (...) {
+            rollback();
+            throw;
+        }
+        if (isOwn) {
+            close();
+        }
+    }
+
+    void begin() override { open("BEGIN"); }
+
+    void commit() override {
+        flush();
+        if (isChanged_) {
+            writeFacets();
+            /* First the row that every batch changes, so that batches come one after another. */
+            addToState("generation", 1);
+            addToState("songs", songs_);
+            for (const auto &[name, change] : facetCounts_) {
+                addToState(name, change);
+            }
+        }
+        close();
+    }
+
+    void rollback() noexcept override {
+        if (isOpen_) {
+            isOpen_ = false;
+            try {
+                connection_.run(std::string("ROLLBACK"));
+            } catch (const std::exception &) {
+                /* The server is gone, and undoes the batch by itself. */
+                isOpen_ = false;
+            }
+        }
+    }
+
+    void putSong(const Song &song) override {
+        const auto [place, isNew] = placeOf_.emplace(song.path, pending_.size());
+        if (isNew) {
+            pending_.push_back(song);
+        } else {
+            pending_[place->second] = song;
+        }
+        if (pending_.size() >= kSongsAtOnce) {
+            flush();
+        }
+    }
+
+    bool removeSong(const std::string &path) override {
+        if (placeOf_.count(path) > 0) {
+            flush();
+        }
+        Sql sql = newSql("DELETE FROM songs WHERE path=");
+        const Result row = connection_.run(sql.bind(path).add(" RETURNING artist, album, genre"));
+        if (row.size() == 0) {
+            return false;
+        }
+        countFacets(facetChanges_, std::string(row[0].text(0)), std::string(row[0].text(1)),
+                    std::string(row[0].text(2)), -1);
+        --songs_;
+        isChanged_ = true;
+        return true;
+    }
+
+    bool removePlaylist(const std::string &path) override {
+        Sql sql = newSql("DELETE FROM playlists WHERE path=");
+        return connection_.run(sql.bind(path).add(" RETURNING id")).size() > 0;
+    }
+
+    void finish(const Progress &progress) override {
+        if (state("anchored") == state("generation")) {
+            return;
+        }
+        connection_.run(std::string(kLockAnchors));
+        try {
+            setAnchors(progress);
+        } catch (...) {
+            rollback();
+            if (!connection_.isBroken()) {
+                connection_.run(std::string(kUnlockAnchors));
+            }
+            throw;
+        }
+        connection_.run(std::string(kUnlockAnchors));
+        refreshStatistics();
+    }
+
+    std::int64_t songCount() override { return state("songs"); }
+
+    std::vector<Notice> notices(int limit) override {
+        Sql sql = newSql("SELECT id, path, former_path, operation FROM notices ORDER BY id LIMIT ");
+        const Result rows = connection_.run(sql.bind(std::int64_t{limit}));
+        std::vector<Notice> notices;
+        notices.reserve(static_cast<size_t>(rows.size()));
+        for (int i = 0; i < rows.size(); ++i) {
+            notices.push_back({rows[i].integer(0), std::string(rows[i].text(1)),
+                               std::string(rows[i].text(2)), static_cast<int>(rows[i].integer(3))});
+        }
+        return notices;
+    }
+
+    void removeNotice(std::int64_t id) override {
+        connection_.run(newSql("DELETE FROM notices WHERE id=").bind(id));
+    }
+
+    void check() override {
+        open(kSnapshot);
+        try {
+            checkCounts();
+            checkKeys();
+        } catch (...) {
+            rollback();
+            throw;
+        }
+        close();
+    }
+
+  private:
+    void open(const char *how) {
+        connection_.run(std::string(how));
+        isOpen_ = true;
+        isChanged_ = false;
+        songs_ = 0;
+        pending_.clear();
+        placeOf_.clear();
+        facetChanges_.clear();
+        facetCounts_.clear();
+    }
+
+    void close() {
+        connection_.run(std::string("COMMIT"));
+        isOpen_ = false;
+    }
+
+    Result nextFiles() { return connection_.runOnce("FETCH 2000 FROM files"); }
+
+    std::int64_t state(const std::string &name) {
+        return connection_.integer(newSql("SELECT value FROM state WHERE name=").bind(name));
+    }
+
+    void addToState(const std::string &name, std::int64_t change) {
+        if (change != 0) {
+            Sql sql = newSql("UPDATE state SET value=value+").bind(change);
+            connection_.run(sql.add(" WHERE name=").bind(name));
+        }
+    }
+
+    void setState(const std::string &name, std::int64_t value) {
+        Sql sql = newSql("UPDATE state SET value=").bind(value);
+        connection_.run(sql.add(" WHERE name=").bind(name));
+    }
+
+    /* Sends what was put. A song that another program has inserted meanwhile is one that is known
+     * when it is looked for again. */
+    void flush() {
+        while (!pending_.empty()) {
+            std::vector<Song> songs = std::move(pending_);
+            pending_.clear();
+            placeOf_.clear();
+            isChanged_ = true;
+            const auto stored = loadSongs(connection_, songs);
+            SongArrays changed;
+            SongArrays added;
+            std::map<std::string, Song *> missing;
+            for (Song &song : songs) {
+                const auto known = stored.find(song.path);
+                if (known == stored.end()) {
+                    added.add(song, 0);
+                    missing.emplace(song.path, &song);
+                    continue;
+                }
+                changed.add(song, known->second.id);
+                noteChange(known->second, song);
+            }
+            if (!changed.isEmpty()) {
+                connection_.run(changed.replacement());
+            }
+            if (!added.isEmpty()) {
+                insert(added, missing);
+            }
+        }
+    }
+
+    void noteChange(const StoredSong &before, const Song &now) {
+        if (!before.isShownAs(now)) {
+            countFacets(facetChanges_, before.artist, before.album, before.genre, -1);
+            countFacets(facetChanges_, now.artist, now.album, now.genre, 1);
+        }
+    }
+
+    void insert(SongArrays &added, std::map<std::string, Song *> &missing) {
+        const Result rows = connection_.run(added.insertion());
+        for (int i = 0; i < rows.size(); ++i) {
+            const auto song = missing.find(std::string(rows[i].text(0)));
+            countFacets(facetChanges_, song->second->artist, song->second->album,
+                        song->second->genre, 1);
+            ++songs_;
+            missing.erase(song);
+        }
+        for (const auto &[path, song] : missing) {
+            putSong(*song);
+        }
+    }
+
+    void writeFacets() {
+        FacetArrays changes;
+        for (const auto &[facet, change] : facetChanges_) {
+            if (change != 0) {
+                changes.add(facet, change);
+            }
+        }
+        if (changes.isEmpty()) {
+            return;
+        }
+        const Result rows = connection_.run(changes.addition());
+        FacetArrays emptied;
+        for (int i = 0; i < rows.size(); ++i) {
+            const std::int64_t songs = rows[i].integer(3);
+            const FacetChanges::key_type facet{static_cast<int>(rows[i].integer(0)),
+                                               std::string(rows[i].text(1)),
+                                               std::string(rows[i].text(2))};
+            if (songs == 0) {
+                emptied.add(facet, 0);
+                --facetCounts_[stateOf(std::get<0>(facet))];
+            } else if (songs == facetChanges_[facet]) {
+                ++facetCounts_[stateOf(std::get<0>(facet))];
+            }
+        }
+        if (!emptied.isEmpty()) {
+            connection_.run(emptied.removal());
+        }
+    }
+
+    static std::string stateOf(int number) {
+        return std::string(facets().at(static_cast<size_t>(number) - 1).state);
+    }
+
+    void setAnchors(const Progress &progress) {
+        open(kSnapshot);
+        const std::int64_t generation = state("generation");
+        const int total = static_cast<int>(storedOrders().size()) + 1;
+        int done = 0;
+        const auto step = [&] {
+            if (progress) {
+                progress(++done, total);
+            }
+        };
+        connection_.run(
+            "CREATE TEMPORARY TABLE ordered ON COMMIT DROP AS SELECT id, path, title_key, "
+            "album_key, artist_key, genre_key, year, duration, row_number() OVER (ORDER BY " +
+            orderText({Column::Album, false}, "") + ") AS tail FROM songs");
+        step();
+        connection_.run(std::string("DELETE FROM anchors"));
+        for (const StoredOrder &order : storedOrders()) {
+            Sql sql = newSql("INSERT INTO anchors SELECT ");
+            sql.bind(std::int64_t{order.number}).add(", at/").bind(kAnchorDistance);
+            sql.add(", id FROM (SELECT id, row_number() OVER (ORDER BY ");
+            sql.add(orderColumn(order.leading.column)).add(order.leading.descending ? " DESC" : "");
+            sql.add(", tail)-1 AS at FROM ordered) AS places WHERE at%");
+            connection_.run(sql.bind(kAnchorDistance).add("=0"));
+            step();
+        }
+        setState("anchored", generation);
+        close();
+    }
+
+    /* Without them the server would guess how often words come. */
+    void refreshStatistics() {
+        const std::int64_t songs = state("songs");
+        if (std::abs(songs - state("counted")) * kRecountShare > songs) {
+            connection_.run(std::string("ANALYZE songs, facets, playlists, anchors"));
+            setState("counted", songs);
+        }
+    }
+
+    [[noreturn]] static void damaged(const std::string &how) {
+        throw DatabaseError(KLIB_ERR_DATABASE_FAILED, "the media database is damaged: " + how);
+    }
+
+    void checkCounts() {
+        if (connection_.integer(newSql("SELECT count(*) FROM songs")) != state("songs")) {
+            damaged("the number of songs is not the one on record");
+        }
+        for (const Facet &facet : facets()) {
+            const std::string kept =
+                "SELECT key, name, songs FROM facets WHERE facet=" + std::to_string(facet.number);
+            std::string real = "SELECT ";
+            real.append(columnInfo(facet.column).key).append(", ");
+            real.append(columnInfo(facet.column).name)
+                .append(", count(*) FROM songs GROUP BY 1, 2");
+            std::string differences = "SELECT count(*) FROM ((";
+            differences.append(kept).append(" EXCEPT ").append(real).append(") UNION ALL (");
+            differences.append(real).append(" EXCEPT ").append(kept).append(")) AS differences");
+            const std::string count = "SELECT count(*) FROM (" + kept + ") AS kept";
+            if (connection_.integer(newSql(differences)) != 0 ||
+                connection_.integer(newSql(count)) != state(std::string(facet.state))) {
+                damaged("the " + std::string(facet.state) +
+                        " on record are not those of the songs");
+            }
+        }
+    }
+
+    /* The keys are what searches and orders go by. */
+    void checkKeys() {
+        connection_.run(
+            newSql("DECLARE files NO SCROLL CURSOR FOR SELECT path, title, album, artist, genre, "
+                   "album_artist, path_key, title_key, album_key, artist_key, genre_key, "
+                   "album_artist_key FROM songs"));
+        for (Result rows = nextFiles(); rows.size() > 0; rows = nextFiles()) {
+            for (int i = 0; i < rows.size(); ++i) {
+                for (int column = 0; column < 6; ++column) {
+                    if (foldedKey(rows[i].text(column)) != rows[i].text(column + 6)) {
+                        damaged("a song has a key that is not its own");
+                    }
+                }
+            }
+        }
+    }
+
+    Connection connection_;
+    bool isOpen_ = false;
+
+    /* Of the batch. */
+    bool isChanged_ = false;
+    std::int64_t songs_ = 0;  // come, less those gone
+    std::vector<Song> pending_;
+    std::unordered_map<std::string, size_t> placeOf_;
+    FacetChanges facetChanges_;
+    std::map<std::string, std::int64_t> facetCounts_;
+};
+
+}  // namespace
+
+std::unique_ptr<Catalogue> openCatalogue(const std::string &place) {
+    return std::make_unique<PostgresqlCatalogue>("postgresql:" + place);
+}
+
+}  // namespace zano::mediadb::postgresql

@@ -1,0 +1,116 @@
+/* libpq's handles as objects. Failures throw DatabaseError
+ * with the server's own words. */
+#pragma once
+
+#include <cstdint>
+#include <map>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "../catalogue.h"
+#include "../query/render.h"
+#include "libpq.h"
+
+namespace zano::mediadb::postgresql {
+
+const Dialect &dialect();
+Sql newSql(std::string_view text);
+
+/* What the server refused, by its SQLSTATE. */
+class ServerError : public DatabaseError {
+  public:
+    ServerError(int code, const std::string &message, std::string state)
+        : DatabaseError(code, message), state_(std::move(state)) {}
+    const std::string &state() const { return state_; }
+
+  private:
+    std::string state_;
+};
+
+/* One row of a result, which must outlive it. */
+class Row {
+  public:
+    Row(const PGresult *result, int row) : result_(result), row_(row) {}
+
+    /* Numbers are 0 where the value is null. */
+    std::int64_t integer(int column) const;
+    double real(int column) const;
+    std::string_view text(int column) const;
+
+  private:
+    const PGresult *result_;
+    int row_;
+};
+
+class Result {
+  public:
+    explicit Result(PGresult *result) : result_(result) {}
+
+    PGresult *get() const { return result_.get(); }
+    int size() const { return libpq().ntuples(result_.get()); }
+    Row operator[](int row) const { return {result_.get(), row}; }
+
+  private:
+    struct Clear {
+        void operator()(PGresult *result) const { libpq().clear(result); }
+    };
+    std::unique_ptr<PGresult, Clear> result_;
+};
+
+/* An array value in text form, for a parameter that is unnested. */
+class ArrayText {
+  public:
+    void add(std::int64_t value) { next().append(std::to_string(value)); }
+    void add(int value) { add(std::int64_t{value}); }
+    void add(double value);
+    void add(std::string_view value) { appendTextElement(next(), value); }
+    void addPath(std::string_view value) { appendPathElement(next(), value); }
+    std::string take() { return text_.empty() ? "{}" : std::move(text_) + "}"; }
+
+  private:
+    std::string &next() { return text_.append(text_.empty() ? "{" : ","); }
+    std::string text_;
+};
+
+class Connection {
+  public:
+    /* For writing, the primary among several hosts. */
+    enum class Access { Read, Write };
+    Connection(const std::string &uri, Access access);
+
+    /* Texts of ours, several statements perhaps; the last one's result, as text. */
+    Result run(const std::string &sql);
+    /* One statement of ours that is not kept. */
+    Result runOnce(const char *sql);
+    /* One statement, with its values bound. */
+    Result run(const Sql &sql) { return execute(prepare(sql.text()), sql.values()); }
+    /* So that a text that the server refuses fails before it is run. */
+    void check(const Sql &sql) { prepare(sql.text()); }
+    /* The first column of the first row; `fallback` when there is none. */
+    std::int64_t integer(const Sql &sql, std::int64_t fallback = 0);
+
+    bool isBroken() const { return libpq().status(connection_.get()) != CONNECTION_OK; }
+
+  private:
+    struct Finish {
+        void operator()(PGconn *connection) const { libpq().finish(connection); }
+    };
+    /* As the server understood it. */
+    struct Prepared {
+        std::string name;
+        std::vector<Oid> types;
+    };
+
+    const Prepared &prepare(const std::string &sql);
+    Result execute(const Prepared &statement, const std::vector<Value> &values);
+    Result checked(PGresult *result) const;
+    void applySettings(Access access);
+
+    std::unique_ptr<PGconn, Finish> connection_;
+    std::map<std::string, Prepared, std::less<>> prepared_;
+    std::uint64_t names_ = 0;
+};
+
+}  // namespace zano::mediadb::postgresql

@@ -1,0 +1,44 @@
+/* The tables of the media database in PostgreSQL, in a schema of their own named "zano";
+ * docs/media-database.md describes them. */
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "handle.h"
+
+namespace zano::mediadb::postgresql {
+
+constexpr std::int64_t kSchemaVersion = 1;
+
+/* Connects to the primary. Missing tables are made and an older schema is migrated, by one program
+ * while others wait; a schema of another program or a newer version is left as it is and throws. */
+Connection openForWriting(const std::string &uri);
+
+/* Throws unless the version is the one that this program knows. */
+void requireVersion(std::int64_t version);
+
+/* The columns whose distinct values are kept counted. */
+struct Facet {
+    Column column;
+    int number;              // in the database
+    std::string_view state;  // the name of the count of its values
+};
+const std::vector<Facet> &facets();
+
+/* An order that is read from an index, and for which anchors are kept. */
+struct StoredOrder {
+    OrderTerm leading;
+    int number;  // in the database, of its anchors
+};
+const std::vector<StoredOrder> &storedOrders();
+const StoredOrder *findStoredOrder(const OrderTerm &leading);
+
+/* The columns that decide between songs whose leading column is equal; none for id and path. */
+std::vector<std::string_view> tailColumns(Column leading);
+
+/* "artist_key DESC, album_key, disc, ..", with a qualifier before each. */
+std::string orderText(const OrderTerm &leading, std::string_view qualifier);
+
+}  // namespace zano::mediadb::postgresql
