@@ -11,6 +11,7 @@
 #include <fstream>
 #include <random>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "mediadb/catalogue.h"
@@ -20,11 +21,15 @@ namespace zano::mediadb {
 
 class MediaDatabaseTest : public testing::Test {
   protected:
-    MediaDatabaseTest() {
+    /* `location`: "" for a file of SQLite in a folder of its own. */
+    explicit MediaDatabaseTest(std::string location = "") : location_(std::move(location)) {
         std::string pattern = (std::filesystem::temp_directory_path() / "mediadb-XXXXXX").string();
         folder_ = mkdtemp(pattern.data());
         std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
-        setSetting(location());
+        if (location_.empty()) {
+            location_ = "sqlite:" + databasePath();
+        }
+        setSetting(location_);
     }
     ~MediaDatabaseTest() override {
         std::filesystem::remove(ZANO_PATH_CONF);
@@ -32,7 +37,7 @@ class MediaDatabaseTest : public testing::Test {
     }
 
     std::string databasePath() const { return folder_ + "/media.db"; }
-    std::string location() const { return "sqlite:" + databasePath(); }
+    const std::string &location() const { return location_; }
     static void setSetting(const std::string &value) {
         std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << value << "\"\n";
     }
@@ -90,6 +95,7 @@ class MediaDatabaseTest : public testing::Test {
 
   private:
     std::string folder_;
+    std::string location_;
 };
 
 }  // namespace zano::mediadb

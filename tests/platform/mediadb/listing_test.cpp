@@ -6,7 +6,7 @@
 #include <set>
 #include <tuple>
 
-#include "fixture.h"
+#include "engines.h"
 #include "text/fold.h"
 
 namespace zano::mediadb {
@@ -77,7 +77,7 @@ class Songs {
     int next_ = 0;
 };
 
-class ListingTest : public MediaDatabaseTest {
+class ListingTest : public EngineTest {
   protected:
     using Model = std::map<std::string, Song>;
 
@@ -185,7 +185,7 @@ class ListingTest : public MediaDatabaseTest {
     }
 };
 
-TEST_F(ListingTest, EveryOrderSearchAndPageAgreesWithAListKeptByHand) {
+TEST_P(ListingTest, EveryOrderSearchAndPageAgreesWithAListKeptByHand) {
     Songs songs(1);
     Model model;
     auto catalogue = openCatalogue(location());
@@ -231,7 +231,7 @@ TEST_F(ListingTest, EveryOrderSearchAndPageAgreesWithAListKeptByHand) {
 }
 
 /* Each song goes right before the one put before it, so that every gap is used up. */
-TEST_F(ListingTest, SongsPutIntoOneGapKeepTheirOrder) {
+TEST_P(ListingTest, SongsPutIntoOneGapKeepTheirOrder) {
     auto catalogue = openCatalogue(location());
     put(*catalogue, {song("/m/first", "a"), song("/m/last", "z")});
     std::vector<std::string> expectedOrder = {"/m/last"};
@@ -251,7 +251,7 @@ TEST_F(ListingTest, SongsPutIntoOneGapKeepTheirOrder) {
     EXPECT_EQ(found("m18").size(), 100U);
 }
 
-TEST_F(ListingTest, SearchIsWhatPeopleMeanByIt) {
+TEST_P(ListingTest, SearchIsWhatPeopleMeanByIt) {
     auto catalogue = openCatalogue(location());
     const std::vector<std::string> titles = {"Beyonc\u00E9",
                                              "Beyonce\u0301 live",
@@ -317,7 +317,7 @@ TEST_F(ListingTest, SearchIsWhatPeopleMeanByIt) {
     }
 }
 
-TEST_F(ListingTest, FilesOfAFolderAreThoseAtAndBelowIt) {
+TEST_P(ListingTest, FilesOfAFolderAreThoseAtAndBelowIt) {
     auto catalogue = openCatalogue(location());
     put(*catalogue, {song("/m/a/2", "x"), song("/m/a-b/1", "x"), song("/m/a", "x"),
                      song("/m/a/1", "x"), song("/m/b", "x"), song("/m/a0", "x")});
@@ -334,7 +334,7 @@ TEST_F(ListingTest, FilesOfAFolderAreThoseAtAndBelowIt) {
     EXPECT_EQ(below(""), below("/m"));
 }
 
-TEST_F(ListingTest, RandomGivesDifferentSongsEachOnce) {
+TEST_P(ListingTest, RandomGivesDifferentSongsEachOnce) {
     auto catalogue = openCatalogue(location());
     std::vector<Song> songs;
     for (int i = 0; i < 500; ++i) {
@@ -365,7 +365,7 @@ TEST_F(ListingTest, RandomGivesDifferentSongsEachOnce) {
     MediaInfoDBClose(playlists);
 }
 
-TEST_F(ListingTest, RecordsHoldTheRowAndNothingElse) {
+TEST_P(ListingTest, RecordsHoldTheRowAndNothingElse) {
     auto catalogue = openCatalogue(location());
     Song full = song("/m/\xFF.mp3", std::string(252, 'x') + "\u00E9\u00E9");
     full.album = "Album";
@@ -405,7 +405,7 @@ TEST_F(ListingTest, RecordsHoldTheRowAndNothingElse) {
     MediaInfoDBClose(result);
 }
 
-TEST_F(ListingTest, PlaylistsAreSavedFoundChangedAndDeleted) {
+TEST_P(ListingTest, PlaylistsAreSavedFoundChangedAndDeleted) {
     ZANO_MEDIA_INFO row{};
     std::strcpy(row.path, "/music/pl/a.m3u");
     std::strcpy(row.title, "Sp\u00E4ter");
@@ -440,6 +440,8 @@ TEST_F(ListingTest, PlaylistsAreSavedFoundChangedAndDeleted) {
     EXPECT_EQ(titles(nullptr), "2renamed;");
     EXPECT_EQ(MediaInfoDBGetCount(3, "*", nullptr, 0, 0), 1);
 }
+
+ZANO_FOR_EVERY_ENGINE(ListingTest);
 
 }  // namespace
 }  // namespace zano::mediadb

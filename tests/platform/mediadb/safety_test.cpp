@@ -10,7 +10,7 @@
 #include <cstring>
 #include <sstream>
 
-#include "fixture.h"
+#include "engines.h"
 #include "mediadb/sqlite/handle.h"
 
 namespace zano::mediadb {
@@ -22,16 +22,43 @@ std::string contentsOf(const std::string &path) {
     return text.str();
 }
 
-class SafetyTest : public MediaDatabaseTest {
+void fillCatalogue(const std::string &location) {
+    auto catalogue = openCatalogue(location);
+    catalogue->begin();
+    const std::pair<const char *, std::string> songs[] = {
+        {"/music/a", "One"}, {"/music/b", "Two"}, {"/music/c", std::string(4000, 'a')}};
+    for (const auto &[path, title] : songs) {
+        Song song;
+        song.path = path;
+        song.title = title;
+        catalogue->putSong(song);
+    }
+    catalogue->commit();
+    catalogue->finish({});
+}
+
+class SafetyTest : public EngineTest {
   protected:
-    void fill() {
-        auto catalogue = openCatalogue(location());
-        put(*catalogue, {song("/music/a", "One"), song("/music/b", "Two"),
-                         song("/music/c", std::string(4000, 'a'))});
+    void fill() { fillCatalogue(location()); }
+
+    /* Everything that is stored. */
+    std::string contents() const {
+        return isSqlite()
+                   ? contentsOf(databasePath())
+                   : Cluster::run(location(),
+                                  "SELECT (SELECT string_agg(s::text, ' ') FROM zano.songs s) || "
+                                  "(SELECT string_agg(t::text, ' ') FROM zano.state t) || "
+                                  "(SELECT string_agg(c.oid::text, ' ') FROM pg_class c)");
     }
 };
 
-TEST_F(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
+/* What is of a file only. */
+class FileTest : public MediaDatabaseTest {
+  protected:
+    void fill() { fillCatalogue(location()); }
+};
+
+TEST_P(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
     fill();
     const std::vector<std::string> conditions = {
         "1=1; drop table songs",
@@ -109,7 +136,7 @@ TEST_F(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
             return deep + "id=1";
         }(),
     };
-    const std::string before = contentsOf(databasePath());
+    const std::string before = contents();
     for (const std::string &condition : conditions) {
         for (const int table : {0, 3, 4}) {
             EXPECT_EQ(MediaInfoDBOpen(table, "*", condition.c_str(), nullptr, nullptr, 0, 50, 0),
@@ -132,12 +159,12 @@ TEST_F(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
     }
     EXPECT_EQ(MediaInfoDBOpen(7, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
     EXPECT_EQ(MediaInfoDBOpen(-1, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
-    EXPECT_TRUE(before == contentsOf(databasePath())) << "the database file changed";
+    EXPECT_TRUE(before == contents()) << "the database changed";
     EXPECT_EQ(rows(nullptr, "path").size(), 3U);
 }
 
 /* SQLite's own matching would not come back from the first of these. */
-TEST_F(SafetyTest, HostilePatternsAndLongTextsAreAnswered) {
+TEST_P(SafetyTest, HostilePatternsAndLongTextsAreAnswered) {
     fill();
     std::string percents;
     for (int i = 0; i < 40; ++i) {
@@ -157,38 +184,66 @@ TEST_F(SafetyTest, HostilePatternsAndLongTextsAreAnswered) {
     EXPECT_EQ(rows(("id in (" + ids + ")").c_str(), "path").size(), 3U);
 }
 
-TEST_F(SafetyTest, ConditionsMeanWhatTheySay) {
+TEST_P(SafetyTest, ConditionsMeanWhatTheySay) {
     fill();
-    const std::vector<std::pair<const char *, size_t>> cases = {{"id=1", 1},
-                                                                {" id = 2 ", 1},
-                                                                {"id<>2", 2},
-                                                                {"id!=2", 2},
-                                                                {"id>=2 and id<=3", 2},
-                                                                {"id<2 or id>2", 2},
-                                                                {"not (id=1)", 2},
-                                                                {"id between 2 and 3", 2},
-                                                                {"id not between 2 and 3", 1},
-                                                                {"id in (1,3,99)", 2},
-                                                                {"id not in (1)", 2},
-                                                                {"title='One'", 1},
-                                                                {"title='one'", 0},
-                                                                {"lower(title)='one'", 1},
-                                                                {"title like 'one'", 0},
-                                                                {"title ilike 'ONE'", 1},
-                                                                {"title not ilike 'one'", 2},
-                                                                {"length(title)=3", 2},
-                                                                {"title is null", 0},
-                                                                {"title is not null", 3},
-                                                                {"1=1", 3},
-                                                                {"1=2", 0},
-                                                                {"title='it''s'", 0},
-                                                                {"path like '/music/_'", 3},
-                                                                {"path like '/MUSIC/%'", 0},
-                                                                {"id=-1", 0},
-                                                                {"year < 0.5", 3},
-                                                                {"TITLE='One' AND ID=1", 1},
-                                                                {"", 3},
-                                                                {"  ", 3}};
+    const std::vector<std::pair<const char *, size_t>> cases = {
+        {"id=1", 1},
+        {" id = 2 ", 1},
+        {"id<>2", 2},
+        {"id!=2", 2},
+        {"id>=2 and id<=3", 2},
+        {"id<2 or id>2", 2},
+        {"not (id=1)", 2},
+        {"id between 2 and 3", 2},
+        {"id not between 2 and 3", 1},
+        {"id in (1,3,99)", 2},
+        {"id not in (1)", 2},
+        {"title='One'", 1},
+        {"title='one'", 0},
+        {"lower(title)='one'", 1},
+        {"title like 'one'", 0},
+        {"title ilike 'ONE'", 1},
+        {"title not ilike 'one'", 2},
+        {"length(title)=3", 2},
+        {"title is null", 0},
+        {"title is not null", 3},
+        {"1=1", 3},
+        {"1=2", 0},
+        {"title='it''s'", 0},
+        {"path like '/music/_'", 3},
+        {"path like '/MUSIC/%'", 0},
+        {"id=-1", 0},
+        {"year < 0.5", 3},
+        {"year='0'", 3},
+        {"year='x'", 0},
+        {"year<'x'", 3},
+        {"id in ('2','x',3.0)", 2},
+        {"title>5", 3},
+        {"title='5'", 0},
+        {"'5'=5", 0},
+        {"'a'='A'", 0},
+        {"lower('A')='a'", 3},
+        {"length('ab')=2", 3},
+        {"length(title)='3'", 0},
+        {"'Abc' ilike 'aB_'", 3},
+        {"year like '0'", 3},
+        {"id between '2' and 3", 2},
+        {"title between 'A' and 'P'", 1},
+        {"path ilike '/MUSIC/A'", 1},
+        {"path like '%_sic/b'", 1},
+        {"path like '%/b'", 1},
+        {"length(path)=8", 3},
+        {"path in ('/music/a','/x')", 1},
+        {"lower(path)='/music/c'", 1},
+        {"path>'/music/a'", 2},
+        {"album_artist ilike 'x%'", 0},
+        {"lower(title) ilike 'ONE'", 1},
+        {"lower(title) like 'o_e'", 1},
+        {"duration=0 and duration<'1.5'", 3},
+        {"not (id in (1) or title is null)", 2},
+        {"TITLE='One' AND ID=1", 1},
+        {"", 3},
+        {"  ", 3}};
     for (const auto &[condition, count] : cases) {
         EXPECT_EQ(rows(condition, "path").size(), count) << condition;
         EXPECT_EQ(MediaInfoDBGetCount(0, "*", condition, 0, 0), static_cast<int>(count))
@@ -196,7 +251,7 @@ TEST_F(SafetyTest, ConditionsMeanWhatTheySay) {
     }
 }
 
-TEST_F(SafetyTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
+TEST_F(FileTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
     const auto refused = [this](int code, const std::string &what) {
         const std::string before = contentsOf(databasePath());
         EXPECT_EQ(rows(nullptr, nullptr)[0].substr(0, 7), "failed:") << what;
@@ -236,7 +291,7 @@ TEST_F(SafetyTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
 }
 
 /* A reader whose user may not write in the folder, when the writer is long gone. */
-TEST_F(SafetyTest, ListsOfTextsHoldAnyBytes) {
+TEST_P(SafetyTest, ListsOfTextsHoldAnyBytes) {
     const std::vector<std::string> paths = {"/a/\"quoted\"", "/a/back\\slash\\\\", "/a/it's",
                                             "/a/tab\tand\x01", "/a/\xC3\xA9\xE3\x83\x89"};
     const std::string notText = "/a/\xFF";
@@ -269,7 +324,7 @@ int statusOfChild(Action action) {
 }
 
 /* As a web front of another user, who may not write in the database's folder. */
-TEST_F(SafetyTest, ADatabaseIsReadableWithoutTheRightToWrite) {
+TEST_F(FileTest, ADatabaseIsReadableWithoutTheRightToWrite) {
     fill();
     EXPECT_EQ(std::filesystem::file_size(databasePath() + "-wal"), 0U) << "kept, but empty";
     const auto folder = std::filesystem::path(databasePath()).parent_path();
@@ -289,7 +344,7 @@ TEST_F(SafetyTest, ADatabaseIsReadableWithoutTheRightToWrite) {
     EXPECT_EQ(found, 3);
 }
 
-TEST_F(SafetyTest, AResultEndsWithTheProcessThatOpenedIt) {
+TEST_P(SafetyTest, AResultEndsWithTheProcessThatOpenedIt) {
     fill();
     MEDIA_DB_RESULT *result = MediaInfoDBOpen(0, "*", nullptr, nullptr, "path", 0, 0, 0);
     ASSERT_NE(result, nullptr);
@@ -305,7 +360,7 @@ TEST_F(SafetyTest, AResultEndsWithTheProcessThatOpenedIt) {
     MediaInfoDBClose(result);
 }
 
-TEST_F(SafetyTest, ManyMayBeTheFirstToWrite) {
+TEST_P(SafetyTest, ManyMayBeTheFirstToWrite) {
     std::array<int, 2> gate{};
     ASSERT_EQ(pipe(gate.data()), 0);
     std::vector<pid_t> children;
@@ -331,7 +386,7 @@ TEST_F(SafetyTest, ManyMayBeTheFirstToWrite) {
 }
 
 /* Changing what is not there makes no database either. */
-TEST_F(SafetyTest, ChangesOfNothingMakeNoDatabase) {
+TEST_F(FileTest, ChangesOfNothingMakeNoDatabase) {
     const ZANO_MEDIA_INFO row{};
     EXPECT_EQ(MediaInfoDBUpdate(MEDIA_TABLE_PLAYLISTS, &row), -1);
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_OPEN);
@@ -339,7 +394,7 @@ TEST_F(SafetyTest, ChangesOfNothingMakeNoDatabase) {
     EXPECT_FALSE(std::filesystem::exists(databasePath()));
 }
 
-TEST_F(SafetyTest, AResultSeesOneMomentAndBlocksNobody) {
+TEST_P(SafetyTest, AResultSeesOneMomentAndBlocksNobody) {
     fill();
     MEDIA_DB_RESULT *result = MediaInfoDBOpen(0, "*", nullptr, nullptr, "path", 0, 0, 0);
     ASSERT_NE(result, nullptr);
@@ -357,7 +412,7 @@ TEST_F(SafetyTest, AResultSeesOneMomentAndBlocksNobody) {
 }
 
 /* A database that was put back from a copy is another file under the same name. */
-TEST_F(SafetyTest, AReplacedDatabaseIsNoticed) {
+TEST_F(FileTest, AReplacedDatabaseIsNoticed) {
     fill();
     EXPECT_EQ(rows(nullptr, "path").size(), 3U);
     for (const char *suffix : {"", "-wal", "-shm"}) {
@@ -367,6 +422,8 @@ TEST_F(SafetyTest, AReplacedDatabaseIsNoticed) {
     put(*catalogue, {song("/other/x", "X")});
     EXPECT_EQ(rows(nullptr, "path"), std::vector<std::string>{"/other/x"});
 }
+
+ZANO_FOR_EVERY_ENGINE(SafetyTest);
 
 }  // namespace
 }  // namespace zano::mediadb
