@@ -1,0 +1,30 @@
+/* Every input that the fuzzers found worth keeping, with the compiler at hand. */
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <vector>
+
+#include "read_state.h"
+
+namespace vorelix::fuzz {
+namespace {
+
+TEST(FuzzCorpus, FilesOfTheDeviceAreReadOrRefused) {
+    for (const Target &target : kTargets) {
+        int count = 0;
+        const std::filesystem::path folder = std::filesystem::path(VORELIX_CORPORA) / target.corpus;
+        for (const auto &file : std::filesystem::directory_iterator(folder)) {
+            SCOPED_TRACE(file.path());
+            std::ifstream input(file.path(), std::ios::binary);
+            const std::vector<char> bytes{std::istreambuf_iterator<char>(input), {}};
+            target.read(reinterpret_cast<const std::uint8_t *>(bytes.data()), bytes.size());
+            ++count;
+        }
+        EXPECT_GT(count, 5) << folder;
+    }
+}
+
+}  // namespace
+}  // namespace vorelix::fuzz
