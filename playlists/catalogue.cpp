@@ -110,13 +110,14 @@ void fillAll(ZANO_PLAYLIST &node, const ZANO_MEDIA_INFO &row) {
 }
 
 /* The rows of an open result in their order, or of none: intended and kept, a failed open is an
- * empty list. */
-template <typename Fill>
-int answerList(QueryResult result, Fill fill, const LogMessage<int> &noNode, ZANO_PLAYLIST **list) {
+ * empty list. When memory ran out, the lookup by ids closes before it logs and the listing after:
+ * `noNode` does either, and the result is closed behind it at the latest. */
+template <typename Fill, typename NoNode>
+int answerList(QueryResult result, Fill fill, NoNode noNode, ZANO_PLAYLIST **list) {
     PlaylistList playlists;
     if (result != nullptr && !fetchNodes(result.get(), playlists, fill)) {
+        noNode(result);
         result.reset();
-        noNode(kLoggedNodeSize);
         return -1;
     }
     *list = PlaylistReverse(playlists.release());
@@ -182,7 +183,11 @@ int ZANOPlayListListGetByID(ZANO_PLAYLIST **list, const char *ids) {
     }
     // Not escaped, for it is a list; what is no list of ids makes the open fail.
     std::snprintf(condition.get(), size, "id in (%s)", ids);
-    return answerList(openPlaylists("path", condition.get()), fillPath, kByIdsNoNode, list);
+    const auto closedAndLogged = [](QueryResult &result) {
+        result.reset();
+        kByIdsNoNode(kLoggedNodeSize);
+    };
+    return answerList(openPlaylists("path", condition.get()), fillPath, closedAndLogged, list);
 }
 
 int ZANOPlaylistPathGet(int id, char *out, int size) {
@@ -236,7 +241,8 @@ int ZANOPlaylistListAll(ZANO_PLAYLIST **list, int offset, int limit, int folderF
                      folderFilter != 0 ? " and album ilike 'playlists'" : "");
     QueryResult result(MediaInfoDBOpen(MEDIA_TABLE_PLAYLISTS, "*", condition.text(), nullptr,
                                        order.text(), offset, limit, 1));
-    return answerList(std::move(result), fillAll, kListNoNode, list);
+    const auto logged = [](QueryResult &) { kListNoNode(kLoggedNodeSize); };
+    return answerList(std::move(result), fillAll, logged, list);
 }
 
 int ZANOPlaylistTitleGet(const char *id, char *out, int size) {

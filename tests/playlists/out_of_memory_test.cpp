@@ -55,7 +55,7 @@ TEST_F(LookupOutOfMemory, EachAllocationOfTheCatalogueIsReported) {
         {all, sizeof(ZANO_PLAYLIST), 1,
          "open(3, \"*\", \"path like '/volume1/music/%'\", null, "
          "\"lower(title) asc, lower(album) \", 0, 0, 1)\n"
-         "close\n3 playlist.cpp (386) Failed to alloc 4616\n"},
+         "3 playlist.cpp (386) Failed to alloc 4616\nclose\n"},
         {id, 11, 0, "3 playlist.cpp (297) Failed to alloc(11)\n"},
         {id, 18, 0, "3 playlist.cpp (306) Failed to alloc(18)\n"},
         {title, 11, 0, "3 playlist.cpp:568 Failed to calloc(11) Cannot allocate memory\n"},
