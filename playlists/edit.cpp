@@ -1,4 +1,3 @@
-#include <strings.h>
 #include <vorelix/misc/misc.h>
 #include <vorelix/playlists/playlist.h>
 #include <zanoplatform/playlist_parser.h>
@@ -12,10 +11,10 @@
 #include <cstdlib>
 #include <limits>
 #include <memory>
-#include <string_view>
 #include <utility>
 
 #include "edit_internal.h"
+#include "playlists_internal.h"
 
 namespace vorelix::playlist {
 namespace {
@@ -24,11 +23,6 @@ constexpr const char *kAllFields = "*";
 // Intended and kept: a removal writes no other tags, for it reads none.
 constexpr const char *kRemovalFields = "id, path, title, album";
 constexpr int kSelectionCapacity = 1024;
-
-struct FreeStrings {
-    void operator()(PSZLIST list) const { KLIBCSzListFree(list); }
-};
-using StringList = std::unique_ptr<SZLIST, FreeStrings>;
 
 /* The new sequence of a playlist: room for so many entries, and a null pointer behind them. */
 class EntryArray {
@@ -127,11 +121,6 @@ ZANO_PLAYLIST_REC *nodeAt(ZANO_PLAYLIST_REC *list, std::int64_t position) {
         list = list->next;
     }
     return list;
-}
-
-bool isWebAddress(const char *path) {
-    constexpr std::string_view kScheme = "http://";
-    return strncasecmp(path, kScheme.data(), kScheme.size()) == 0;
 }
 
 bool isThere(const ZANO_MEDIA_INFO &entry) {

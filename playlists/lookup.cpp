@@ -8,7 +8,6 @@
 #include <cstdlib>
 #include <cstring>
 #include <limits>
-#include <memory>
 #include <optional>
 
 #include "log_internal.h"
@@ -22,6 +21,7 @@ using vorelix::LogMessage;
 using vorelix::QueryResult;
 using vorelix::RecordList;
 using vorelix::playlist::kUnit;
+using vorelix::playlist::StringList;
 
 namespace {
 
@@ -32,11 +32,6 @@ constexpr LogMessage<const char *> kNoDatabase{kUnit, "%s (%d) Failed to open me
 constexpr LogMessage<int> kNoNode{kUnit, "%s (%d) Failed to alloc %d", 121};
 
 constexpr int kIdListCapacity = 1024;
-
-struct FreeStrings {
-    void operator()(PSZLIST list) const { KLIBCSzListFree(list); }
-};
-using StringList = std::unique_ptr<SZLIST, FreeStrings>;
 
 /* Fetched nodes in short lists by their id, so that finding one does not walk them all. Nodes
  * of one id share a list and keep their order. Without memory of its own: it cannot fail. */

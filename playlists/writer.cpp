@@ -120,11 +120,6 @@ class PlaylistFile {
     int descriptor_ = 0;
 };
 
-bool isWebAddress(const char *path) {
-    constexpr std::string_view kScheme = "http://";
-    return strncasecmp(path, kScheme.data(), kScheme.size()) == 0;
-}
-
 /* The first place where two texts differ, from their second byte on; their length when they are
  * equal. */
 std::size_t firstDifference(const char *one, const char *other) {
