@@ -8,8 +8,8 @@
 
 namespace {
 
+using stand_in::outcome;
 using stand_in::script;
-using stand_in::takeTrace;
 
 class Count : public stand_in::Test {};
 
@@ -28,42 +28,32 @@ TEST_F(Count, TextsThatReachTheDatabase) {
         {-1, 5, "", 0, '"' + inRoot + '"'},
         {1, 0, "Bob", 0, "null"},
         {1, 1, "Bob", 0, '"' + inRoot + " and title ilike '%Bob%'\""},
-        {1, 2, "Bob", 0, '"' + inRoot + " and artist ilike '%Bob%'\""},
-        {1, 3, "Bob", 0, '"' + inRoot + " and album ilike '%Bob%'\""},
         {1, 4, "'\\", 0, '"' + inRoot + " and genre ilike '%''\\%'\""},
         {2, 5, "a'b", 0,
          '"' + inRoot +
              " and (title ilike '%a''b%' or artist ilike '%a''b%' or album ilike '%a''b%' or "
              "genre ilike '%a''b%')\""},
-        {1, -1, "x", 0, '"' + inRoot + " and  ilike '%x%'\""},
         {1, 6, "x", 0, '"' + inRoot + " and  ilike '%x%'\""},
     };
     for (const auto &each : cases) {
         script().rowCount = each.songs == 0 ? 0 : 42;
         int count = -5;
-        EXPECT_EQ(ZANOPageTotalRowCount(each.songs, each.category, each.keyword, &count), 0);
+        EXPECT_EQ(outcome(ZANOPageTotalRowCount(each.songs, each.category, each.keyword, &count)),
+                  "0 open(" + std::to_string(each.table) + ", \"*\", " + each.condition +
+                      ", null, null, 0, 0, 0)\nclose\n");
         EXPECT_EQ(count, script().rowCount);
-        EXPECT_EQ(takeTrace(), "open(" + std::to_string(each.table) + ", \"*\", " + each.condition +
-                                   ", null, null, 0, 0, 0)\nclose\n");
     }
 }
 
 TEST_F(Count, FailedOpenLeavesTheCount) {
     script().openFails = true;
-    for (const char *keyword : {"x", ""}) {
-        int count = -5;
-        EXPECT_EQ(ZANOPageTotalRowCount(1, 1, keyword, &count), 0);
-        EXPECT_EQ(count, -5);
-        EXPECT_EQ(takeTrace().find("3 "), std::string::npos);
-    }
-}
-
-TEST_F(Count, ConditionWithoutAKeywordIsCutTo4095Bytes) {
+    // A condition without a keyword has 4095 bytes.
     script().musicRoot = std::string(4090, 'r');
-    int count = 0;
-    EXPECT_EQ(ZANOPageTotalRowCount(1, 0, nullptr, &count), 0);
-    EXPECT_EQ(takeTrace(), "open(0, \"*\", \"path like '" + std::string(4084, 'r') +
-                               "\", null, null, 0, 0, 0)\nclose\n");
+    int count = -5;
+    EXPECT_EQ(
+        outcome(ZANOPageTotalRowCount(1, 0, nullptr, &count)),
+        "0 open(0, \"*\", \"path like '" + std::string(4084, 'r') + "\", null, null, 0, 0, 0)\n");
+    EXPECT_EQ(count, -5);
 }
 
 TEST_F(Count, Failures) {
@@ -87,12 +77,11 @@ TEST_F(Count, Failures) {
         script() = stand_in::Script();
         each.prepare();
         int count = -5;
-        EXPECT_EQ(ZANOPageTotalRowCount(each.songs, each.category, "Bob", &count), -1);
+        EXPECT_EQ(outcome(ZANOPageTotalRowCount(each.songs, each.category, "Bob", &count)),
+                  "-1 3 " + each.line + "\n");
         EXPECT_EQ(count, -5);
-        EXPECT_EQ(takeTrace(), "3 " + each.line + "\n");
     }
-    EXPECT_EQ(ZANOPageTotalRowCount(1, 0, nullptr, nullptr), -1);
-    EXPECT_EQ(takeTrace(), "");
+    EXPECT_EQ(outcome(ZANOPageTotalRowCount(1, 0, nullptr, nullptr)), "-1 ");
 }
 
 }  // namespace

@@ -4,54 +4,46 @@
 
 namespace {
 
+using stand_in::outcome;
 using stand_in::row;
 using stand_in::script;
-using stand_in::takeTrace;
 
-class PlaylistRows : public stand_in::Test {};
+/* What comes of telling the indexer counts for the removal alone. */
+class PlaylistRows : public stand_in::Test {
+  protected:
+    PlaylistRows() { script().noticed = -5; }
+
+    const ZANO_MEDIA_INFO playlist = row(7, "a.m3u");
+};
 
 TEST_F(PlaylistRows, Inserted) {
-    const ZANO_MEDIA_INFO playlist = row(7, "a.m3u");
-    script().noticed = -1;
-    EXPECT_EQ(ZANOPlaylistDBSave(&playlist), 0);
-    EXPECT_EQ(takeTrace(),
-              "save(3, 7 a.m3u /volume1/music/a.m3u)\n"
-              "notice(\"/volume1/music/a.m3u\", null, 1)\n");
+    const std::string saved = "save(3, 7 a.m3u /volume1/music/a.m3u)\n";
+    EXPECT_EQ(outcome(ZANOPlaylistDBSave(&playlist)),
+              "0 " + saved + "notice(\"/volume1/music/a.m3u\", null, 1)\n");
     script().saved = -1;
-    EXPECT_EQ(ZANOPlaylistDBSave(&playlist), -1);
-    EXPECT_EQ(takeTrace(),
-              "save(3, 7 a.m3u /volume1/music/a.m3u)\n"
-              "3 musiclib.cpp:499 Failed to insert into playlist table.\n");
+    EXPECT_EQ(outcome(ZANOPlaylistDBSave(&playlist)),
+              "-1 " + saved + "3 musiclib.cpp:499 Failed to insert into playlist table.\n");
 }
 
 TEST_F(PlaylistRows, Updated) {
-    const ZANO_MEDIA_INFO playlist = row(7, "a.m3u");
-    script().noticed = -1;
-    EXPECT_EQ(ZANOPlaylistDBUpdate(&playlist, nullptr), 0);
-    EXPECT_EQ(takeTrace(),
-              "update(3, 7 a.m3u /volume1/music/a.m3u)\n"
-              "notice(\"/volume1/music/a.m3u\", null, 5)\n");
-    EXPECT_EQ(ZANOPlaylistDBUpdate(&playlist, "/b.m3u"), 0);
-    EXPECT_EQ(takeTrace(),
-              "update(3, 7 a.m3u /volume1/music/a.m3u)\n"
-              "notice(\"/volume1/music/a.m3u\", \"/b.m3u\", 4)\n");
+    const std::string updated = "update(3, 7 a.m3u /volume1/music/a.m3u)\n";
+    EXPECT_EQ(outcome(ZANOPlaylistDBUpdate(&playlist, nullptr)),
+              "0 " + updated + "notice(\"/volume1/music/a.m3u\", null, 5)\n");
+    EXPECT_EQ(outcome(ZANOPlaylistDBUpdate(&playlist, "/b.m3u")),
+              "0 " + updated + "notice(\"/volume1/music/a.m3u\", \"/b.m3u\", 4)\n");
     script().updated = -1;
-    EXPECT_EQ(ZANOPlaylistDBUpdate(&playlist, "/b.m3u"), -1);
-    EXPECT_EQ(takeTrace(),
-              "update(3, 7 a.m3u /volume1/music/a.m3u)\n"
-              "3 musiclib.cpp:525 Failed to update playlist in DB.\n");
+    EXPECT_EQ(outcome(ZANOPlaylistDBUpdate(&playlist, "/b.m3u")),
+              "-1 " + updated + "3 musiclib.cpp:525 Failed to update playlist in DB.\n");
 }
 
 TEST_F(PlaylistRows, DeletedByTheDatabaseOrElseByTheIndexer) {
-    script().noticed = -5;
-    EXPECT_EQ(ZANOPlaylistDBDelete("/a b.m3u"), -5);
-    EXPECT_EQ(takeTrace(), "delete(3, \"/a b.m3u\")\nnotice(\"/a b.m3u\", null, 2)\n");
+    const std::string deleted = "-5 delete(3, \"/a b.m3u\")\n";
+    const std::string noticed = "notice(\"/a b.m3u\", null, 2)\n";
+    EXPECT_EQ(outcome(ZANOPlaylistDBDelete("/a b.m3u")), deleted + noticed);
     script().deleted = -1;
-    script().noticed = 0;
-    EXPECT_EQ(ZANOPlaylistDBDelete("/a b.m3u"), 0);
-    EXPECT_EQ(takeTrace(), "delete(3, \"/a b.m3u\")\nexec " ZANO_ROOT
-                           "/usr/zano/bin/zanoindex \"-d\" \"/a b.m3u\"\n"
-                           "notice(\"/a b.m3u\", null, 2)\n");
+    EXPECT_EQ(
+        outcome(ZANOPlaylistDBDelete("/a b.m3u")),
+        deleted + "exec " ZANO_ROOT "/usr/zano/bin/zanoindex \"-d\" \"/a b.m3u\"\n" + noticed);
 }
 
 }  // namespace

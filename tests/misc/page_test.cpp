@@ -38,26 +38,21 @@ TEST(PageBar, LeadsToThePagesThereAre) {
         int page;
         int pages;
         std::string bar;
-        std::string last;  // the piece whose length is the result
     } cases[] = {
-        {1, 1, field("1", "disabled", "1"),
-         " , <span class=\"search_text\">of 1&nbsp;&nbsp;</span>\n"},
-        {1, 0, field("1", "disabled", "0"),
-         " , <span class=\"search_text\">of 0&nbsp;&nbsp;</span>\n"},
-        {2, 3, kFirst + previous("1") + field("2", "", "3") + nextAndLast("3", "3"),
-         nextAndLast("3", "3").substr(nextAndLast("3", "3").find("&nbsp;") + 6)},
-        {3, 3, kFirst + previous("2") + field("3", "", "3"),
-         " , <span class=\"search_text\">of 3&nbsp;&nbsp;</span>\n"},
+        {1, 1, field("1", "disabled", "1")},
+        {1, 0, field("1", "disabled", "0")},
+        {2, 3, kFirst + previous("1") + field("2", "", "3") + nextAndLast("3", "3")},
+        {3, 3, kFirst + previous("2") + field("3", "", "3")},
         {INT_MAX, INT_MIN,
-         kFirst + previous("2147483646") + field("2147483647", "disabled", "-2147483648"),
-         " , <span class=\"search_text\">of -2147483648&nbsp;&nbsp;</span>\n"},
+         kFirst + previous("2147483646") + field("2147483647", "disabled", "-2147483648")},
     };
-    for (const auto &each : cases) {
+    for (const auto &[page, pages, bar] : cases) {
         testing::internal::CaptureStdout();
-        const int result = ZANOAudioPrintPageNav(each.page, each.pages, "Page", "of", "five", "six",
-                                                 "seven", "eight");
-        EXPECT_EQ(testing::internal::GetCapturedStdout(), each.bar);
-        EXPECT_EQ(result, static_cast<int>(each.last.size())) << each.page << " " << each.pages;
+        const int result =
+            ZANOAudioPrintPageNav(page, pages, "Page", "of", "five", "six", "seven", "eight");
+        EXPECT_EQ(testing::internal::GetCapturedStdout(), bar);
+        const std::string last = bar.substr(bar.rfind(page < pages ? "<a " : " , "));
+        EXPECT_EQ(result, static_cast<int>(last.size())) << bar;
     }
 }
 

@@ -1,21 +1,18 @@
-#include <unistd.h>
 #include <vorelix/playlists/playlist.h>
 
 #include <climits>
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
 #include <functional>
-#include <iterator>
 #include <sstream>
 #include <string>
 #include <vector>
 
 #include "support/failing_allocator.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 
 namespace {
 
+using stand_in::outcome;
 using stand_in::script;
 using stand_in::takeTrace;
 
@@ -35,33 +32,33 @@ constexpr Family kFamilies[] = {
 };
 
 /* Each name is a song beside the playlist; names are parted by blanks. */
-class Edit : public stand_in::Test, public testing::WithParamInterface<Family> {
+class Edit : public stand_in::Test,
+             public testing::WithParamInterface<Family>,
+             protected files::Folder {
   protected:
-    Edit() : folder(mkdtemp((testing::TempDir() + "edit_XXXXXX").data())), file(folder + "/l.m3u") {
+    Edit() {
         script().rows = {stand_in::row(12, "")};
         file.copy(script().rows[0].path, file.size());
         script().rows[0].path[file.size()] = '\0';
     }
-    ~Edit() override { std::filesystem::remove_all(folder); }
 
     std::vector<ZANO_MEDIA_INFO> songs(const std::string &names) const {
         std::vector<ZANO_MEDIA_INFO> made;
         std::istringstream words(names);
         for (std::string name; words >> name;) {
             made.push_back(stand_in::row(1, ""));
-            name.insert(0, folder + "/").copy(made.back().path, sizeof made.back().path - 1);
+            path(name).copy(made.back().path, sizeof made.back().path - 1);
         }
         return made;
     }
 
     void given(const std::string &names) const {
         script().entries = songs(names);
-        std::ofstream(file) << "before";
+        files::write(file, "before");
     }
 
     std::string contents() const {
-        std::ifstream stream(file, std::ios::binary);
-        std::string text{std::istreambuf_iterator<char>(stream), {}};
+        std::string text = files::read(file);
         if (text.rfind("#EXTM3U\r\n", 0) == 0) {
             text.erase(0, 9);
         }
@@ -73,6 +70,10 @@ class Edit : public stand_in::Test, public testing::WithParamInterface<Family> {
 
     const char *playlist() const { return GetParam().isShared ? "12" : file.c_str(); }
 
+    int remove(const char *selection) const {
+        return GetParam().removeSongs(playlist(), selection);
+    }
+    int removeMissing() const { return GetParam().removeMissing(playlist()); }
     int update(const std::string &names, int start, int count) const {
         return withRecords(names, [&](ZANO_PLAYLIST_REC *records) {
             return GetParam().updateSongs(playlist(), records, start, count);
@@ -98,8 +99,7 @@ class Edit : public stand_in::Test, public testing::WithParamInterface<Family> {
         return "3 playlist.cpp" + (GetParam().isShared ? shared : personal) + " " + text + "\n";
     }
 
-    std::string folder;
-    std::string file;
+    const std::string file = path("l.m3u");
 
   private:
     int withRecords(const std::string &names,
@@ -121,6 +121,7 @@ INSTANTIATE_TEST_SUITE_P(, Edit, testing::ValuesIn(kFamilies),
                          });
 
 const std::string kSorted = "sort(0 items, 1)\n";
+const char *const kRemovalFields = "id, path, title, album";
 
 TEST_P(Edit, RemovesPositionsOfTheFileAsItWas) {
     const struct {
@@ -136,18 +137,21 @@ TEST_P(Edit, RemovesPositionsOfTheFileAsItWas) {
     };
     for (const auto &each : cases) {
         given(each.entries);
-        EXPECT_EQ(GetParam().removeSongs(playlist(), each.selection), 0) << each.selection;
+        EXPECT_EQ(outcome(remove(each.selection)),
+                  "0 " + looked() + kSorted + parsed(kRemovalFields));
         EXPECT_EQ(contents(), each.left) << each.selection;
-        EXPECT_EQ(takeTrace(), looked() + kSorted + parsed("id, path, title, album"));
     }
 }
 
 TEST_P(Edit, AnEmptySelectionIsASuccess) {
     given("a b");
-    EXPECT_EQ(GetParam().removeSongs(playlist(), ""), 0);
-    EXPECT_EQ(contents(), "before");
-    EXPECT_EQ(takeTrace(),
-              looked() + kSorted + line(" (999)", " (1518)", "There is no selected item."));
+    const std::string expected =
+        "0 " + looked() + kSorted + line(" (999)", " (1518)", "There is no selected item.");
+    for (const bool splitFails : {false, true}) {
+        script().splitFails = splitFails;
+        EXPECT_EQ(outcome(remove("")), expected);
+        EXPECT_EQ(contents(), "before");
+    }
 }
 
 TEST_P(Edit, ReplacesARun) {
@@ -177,12 +181,11 @@ TEST_P(Edit, ReplacesARun) {
         {"a b c", "x", 2, -2, "a b x a b c"},
     };
     for (const auto &each : cases) {
-        const std::string what = std::string(each.entries) + " | " + each.records + " " +
-                                 std::to_string(each.start) + " " + std::to_string(each.count);
         given(each.entries);
-        EXPECT_EQ(update(each.records, each.start, each.count), 0) << what;
-        EXPECT_EQ(contents(), each.expected) << what;
-        EXPECT_EQ(takeTrace(), looked() + parsed("*")) << what;
+        EXPECT_EQ(outcome(update(each.records, each.start, each.count)),
+                  "0 " + looked() + parsed("*"));
+        EXPECT_EQ(contents(), each.expected)
+            << each.entries << " | " << each.records << " " << each.start << " " << each.count;
     }
 }
 
@@ -198,8 +201,8 @@ TEST_P(Edit, StartsBehindTheEnd) {
     };
     given("a b c");
     for (const auto &each : cases) {
-        EXPECT_EQ(update("x", each.start, each.count), -1) << each.line;
-        EXPECT_EQ(takeTrace(), looked() + parsed("*") + line(":1096", ":1687", each.line));
+        EXPECT_EQ(outcome(update("x", each.start, each.count)),
+                  "-1 " + looked() + parsed("*") + line(":1096", ":1687", each.line));
         EXPECT_EQ(contents(), "before") << each.line;
     }
 }
@@ -215,28 +218,25 @@ TEST_P(Edit, AppendsAsManyAsCounted) {
     };
     for (const auto &each : cases) {
         given(each.entries);
-        EXPECT_EQ(append("x y", each.count), 0) << each.entries << each.count;
+        EXPECT_EQ(outcome(append("x y", each.count)), "0 " + looked() + parsed("*"));
         EXPECT_EQ(contents(), each.expected) << each.entries << each.count;
-        EXPECT_EQ(takeTrace(), looked() + parsed("*"));
     }
 }
 
 TEST_P(Edit, KeepsTracksAddressesAndUsb) {
-    script().entries = songs("kept gone");
+    given("kept gone");
     script().entries[0].id = -1;
     script().entries[1].id = 0;
     for (const char *path : {"HTTP://host/x", "https://host/x", "/usb/a.mp3", "http:/a", ""}) {
         script().entries.push_back({});
         std::string(path).copy(script().entries.back().path, 100);
     }
-    std::ofstream(file) << "before";
-    EXPECT_EQ(GetParam().removeMissing(playlist()), 0);
+    EXPECT_EQ(outcome(removeMissing()), "0 " + looked() + parsed("*"));
     EXPECT_EQ(contents(), "kept HTTP://host/x /usb/a.mp3");
-    EXPECT_EQ(takeTrace(), looked() + parsed("*"));
 
-    script().entries.resize(2);
-    script().entries.erase(script().entries.begin());
-    EXPECT_EQ(GetParam().removeMissing(playlist()), 0);
+    given("gone");
+    script().entries[0].id = 0;
+    EXPECT_EQ(removeMissing(), 0);
     EXPECT_EQ(contents(), "");
 }
 
@@ -246,77 +246,53 @@ TEST_P(Edit, NothingIsWrittenBehindTheArray) {
     for (const auto &[edit, expected] :
          {std::pair<std::function<int()>, const char *>{[&] { return append("x", 1); }, "a b"},
           {[&] { return update("x", 0, 0); }, "x a"},
-          {[&] { return GetParam().removeMissing(playlist()); }, "a"}}) {
+          {[&] { return removeMissing(); }, "a"}}) {
         given("a b c");
         EXPECT_EQ(edit(), 0) << expected;
         EXPECT_EQ(contents(), expected);
     }
     takeTrace();
     script().missingFromTotal = 4;
-    EXPECT_EQ(update("x", 0, 0), -1);
-    EXPECT_EQ(takeTrace(),
-              looked() + parsed("*") + line(":1077", ":1668", "Failed to parse playlist."));
+    EXPECT_EQ(outcome(update("x", 0, 0)),
+              "-1 " + looked() + parsed("*") + line(":1077", ":1668", "Failed to parse playlist."));
 }
 
 TEST_P(Edit, PlaylistsThatCannotBeRead) {
     given("");
+    const std::string read = "-1 " + looked() + parsed("*");
+    EXPECT_EQ(outcome(remove("0")), "-1 " + looked() + kSorted + parsed(kRemovalFields) +
+                                        line(" (1006)", " (1525)", "pMusicRec is null."));
+    EXPECT_EQ(outcome(update("x", 0, 0)),
+              read + line(":1077", ":1668", "Failed to parse playlist."));
     const std::string shown = GetParam().isShared ? " (12, " + file + ")" : ": " + file;
-    const struct {
-        std::function<int()> edit;
-        std::string trace;
-    } cases[] = {
-        {[&] { return GetParam().removeSongs(playlist(), "0"); },
-         kSorted + parsed("id, path, title, album") +
-             line(" (1006)", " (1525)", "pMusicRec is null.")},
-        {[&] { return update("x", 0, 0); },
-         parsed("*") + line(":1077", ":1668", "Failed to parse playlist.")},
-        {[&] { return GetParam().removeMissing(playlist()); },
-         parsed("*") + line(":1271", ":1598", "Parse playlist" + shown + " return NULL.")},
-    };
-    for (const auto &each : cases) {
-        EXPECT_EQ(each.edit(), -1) << each.trace;
-        EXPECT_EQ(takeTrace(), looked() + each.trace);
-        EXPECT_EQ(contents(), "before");
-    }
+    EXPECT_EQ(outcome(removeMissing()),
+              read + line(":1271", ":1598", "Parse playlist" + shown + " return NULL."));
+    EXPECT_EQ(contents(), "before");
 }
 
 TEST_P(Edit, FilesThatCannotBeWritten) {
     given("a b c");
     std::filesystem::remove(file);
     std::filesystem::create_directory(file);
+    const std::string notOpened = ": Failed to open " + file + ".\n";
     const std::string notUpdated = "Failed to update playlist.(" + file + ")";
-    const struct {
-        std::function<int()> edit;
-        std::string writer;
-        std::string line;
-    } cases[] = {
-        {[&] { return GetParam().removeSongs(playlist(), "0"); }, "(732)",
-         line(" (1042)", " (1561)", notUpdated)},
-        {[&] { return update("x", 0, 0); }, "(861)", line(" (1138)", " (1729)", notUpdated)},
-        {[&] { return append("x", 1); }, "(861)", line(" (1199)", " (1471)", notUpdated)},
-        {[&] { return GetParam().removeMissing(playlist()); }, "(861)",
-         line(":1296", ":1623", "Failed to write playlist.(" + file + ")")},
-    };
-    for (const auto &each : cases) {
-        EXPECT_EQ(each.edit(), -1) << each.line;
-        const std::string opened =
-            "3 playlist.cpp" + each.writer + ": Failed to open " + file + ".\n";
-        const std::string trace = takeTrace();
-        EXPECT_EQ(trace.substr(trace.find("3 play")), opened + each.line);
-    }
+    const std::string read = "-1 " + looked() + parsed("*") + "3 playlist.cpp(861)" + notOpened;
+    EXPECT_EQ(outcome(remove("0")), "-1 " + looked() + kSorted + parsed(kRemovalFields) +
+                                        "3 playlist.cpp(732)" + notOpened +
+                                        line(" (1042)", " (1561)", notUpdated));
+    EXPECT_EQ(outcome(update("x", 0, 0)), read + line(" (1138)", " (1729)", notUpdated));
+    EXPECT_EQ(outcome(append("x", 1)), read + line(" (1199)", " (1471)", notUpdated));
+    EXPECT_EQ(outcome(removeMissing()),
+              read + line(":1296", ":1623", "Failed to write playlist.(" + file + ")"));
 }
 
 TEST_P(Edit, OutOfMemory) {
     given("a b c");
-    const std::string noList = kSorted + line(" (992)", " (1511)", "Failed to malloc list.");
+    const std::string noList = line(" (992)", " (1511)", "Failed to malloc list.");
     script().splitFails = true;
-    EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
-    EXPECT_EQ(takeTrace(), looked() + noList);
-    EXPECT_EQ(GetParam().removeSongs(playlist(), ""), 0);
-    takeTrace();
+    EXPECT_EQ(outcome(remove("0")), "-1 " + looked() + kSorted + noList);
     script().stringListFails = true;
-    EXPECT_EQ(GetParam().removeSongs(playlist(), "0"), -1);
-    EXPECT_EQ(takeTrace(), looked() + noList.substr(kSorted.size()));
+    EXPECT_EQ(outcome(remove("0")), "-1 " + looked() + noList);
 
     const struct {
         std::function<int()> edit;
@@ -325,38 +301,28 @@ TEST_P(Edit, OutOfMemory) {
     } cases[] = {
         {[&] { return update("x", 9, 0); }, 5, line(":1090", ":1681", "Failed to calloc()")},
         {[&] { return append("x", 4); }, 8, ""},
-        {[&] { return GetParam().removeMissing(playlist()); }, 4, ""},
+        {[&] { return removeMissing(); }, 4, ""},
     };
     for (const auto &each : cases) {
         failing_allocator::failOnSize(each.pointers * sizeof(void *));
-        EXPECT_EQ(each.edit(), -1) << each.pointers;
+        EXPECT_EQ(outcome(each.edit()), "-1 " + looked() + parsed("*") + each.line);
         EXPECT_TRUE(failing_allocator::hasFailed()) << each.pointers;
-        EXPECT_EQ(takeTrace(), looked() + parsed("*") + each.line);
-        EXPECT_EQ(contents(), "before");
     }
+    EXPECT_EQ(contents(), "before");
 }
 
 TEST_P(Edit, BadParameters) {
-    ZANO_PLAYLIST_REC record{};
-    const struct {
-        int result;
-        std::string line;
-    } cases[] = {
-        {GetParam().removeSongs(nullptr, "0"), line(" (979)", " (1505)", "Bad parameter.")},
-        {GetParam().removeSongs(playlist(), nullptr), line(" (979)", " (1505)", "Bad parameter.")},
-        {GetParam().updateSongs(nullptr, &record, 0, 0),
-         line(" (1065)", " (1661)", "Bad parameter.")},
-        {update("", 0, 0), line(" (1065)", " (1661)", "Bad parameter.")},
-        {GetParam().appendSongs(nullptr, &record, 1), line(" (1161)", " (1438)", "Bad parameter.")},
-        {append("", 0), line(" (1161)", " (1438)", "Bad parameter.")},
-        {GetParam().removeMissing(nullptr), line(":1258", ":1592", "Bad parameter.")},
+    const auto bad = [](const std::string &shared, const std::string &personal) {
+        return "-1 " + line(shared, personal, "Bad parameter.");
     };
-    std::string lines;
-    for (const auto &each : cases) {
-        EXPECT_EQ(each.result, -1) << each.line;
-        lines += each.line;
-    }
-    EXPECT_EQ(takeTrace(), lines);
+    ZANO_PLAYLIST_REC record{};
+    EXPECT_EQ(outcome(GetParam().removeSongs(nullptr, "0")), bad(" (979)", " (1505)"));
+    EXPECT_EQ(outcome(remove(nullptr)), bad(" (979)", " (1505)"));
+    EXPECT_EQ(outcome(GetParam().updateSongs(nullptr, &record, 0, 0)), bad(" (1065)", " (1661)"));
+    EXPECT_EQ(outcome(update("", 0, 0)), bad(" (1065)", " (1661)"));
+    EXPECT_EQ(outcome(GetParam().appendSongs(nullptr, &record, 1)), bad(" (1161)", " (1438)"));
+    EXPECT_EQ(outcome(append("", 0)), bad(" (1161)", " (1438)"));
+    EXPECT_EQ(outcome(GetParam().removeMissing(nullptr)), bad(":1258", ":1592"));
 }
 
 class SharedPlaylist : public Edit {};
@@ -364,34 +330,19 @@ INSTANTIATE_TEST_SUITE_P(, SharedPlaylist, testing::Values(kFamilies[0]));
 
 /* The removals ask for the file whatever the lookup gave, the others for what it gave. */
 TEST_P(SharedPlaylist, IdsWithoutAFile) {
-    const struct {
-        std::function<int(const char *id)> edit;
-        std::string withoutRow;
-        std::string withoutFile;
-    } cases[] = {
-        {[](const char *id) { return ZANOPlaylistRemoveSongs(id, "0"); },
-         " (986) Playlist(12, ) does not exist.\n",
-         " (986) Playlist(12, " + file + ") does not exist.\n"},
-        {ZANOPlaylistRemoveMissing, ":1265 Playlist(12, ) does not exist.\n",
-         ":1265 Playlist(12, " + file + ") does not exist.\n"},
-        {[this](const char *) { return update("x", 0, 0); },
-         " (1070) Failed to get playlist path.\n", ""},
-        {[this](const char *) { return append("x", 1); }, " (1166) Failed to get playlist path.\n",
-         ""},
+    const std::string unit = "-1 " + looked() + "3 playlist.cpp";
+    const auto expectRemovalsToMiss = [&](const std::string &shown) {
+        const std::string text = " Playlist(12, " + shown + ") does not exist.\n";
+        EXPECT_EQ(outcome(remove("0")), unit + " (986)" + text);
+        EXPECT_EQ(outcome(removeMissing()), unit + ":1265" + text);
     };
-    for (const auto &each : cases) {
-        const auto rows = script().rows;
-        script().rows.clear();
-        EXPECT_EQ(each.edit("12"), -1) << each.withoutRow;
-        EXPECT_EQ(takeTrace(), looked() + "3 playlist.cpp" + each.withoutRow);
-        script().rows = rows;
-        script().entries = songs("a");
-        std::filesystem::remove(file);
-        EXPECT_EQ(each.edit("12"), each.withoutFile.empty() ? 0 : -1);
-        EXPECT_EQ(takeTrace(),
-                  looked() + (each.withoutFile.empty() ? parsed("*")
-                                                       : "3 playlist.cpp" + each.withoutFile));
-    }
+    script().entries = songs("a");
+    expectRemovalsToMiss(file);
+    EXPECT_EQ(outcome(append("x", 1)), "0 " + looked() + parsed("*"));
+    script().rows.clear();
+    expectRemovalsToMiss("");
+    EXPECT_EQ(outcome(update("x", 0, 0)), unit + " (1070) Failed to get playlist path.\n");
+    EXPECT_EQ(outcome(append("x", 1)), unit + " (1166) Failed to get playlist path.\n");
 }
 
 }  // namespace

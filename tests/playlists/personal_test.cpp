@@ -1,17 +1,15 @@
 #include <dlfcn.h>
 #include <glob.h>
-#include <unistd.h>
 #include <vorelix/playlists/playlist.h>
 
 #include <cstdlib>
 #include <cstring>
-#include <filesystem>
-#include <fstream>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "support/failing_allocator.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 
 namespace {
@@ -29,23 +27,26 @@ Glob theGlob;
 
 class Personal : public stand_in::Test {
   protected:
-    Personal() : folder(mkdtemp((testing::TempDir() + "personal_XXXXXX").data())) {
+    Personal() {
         theGlob = {};
-        std::filesystem::create_directory(folder + "/playlists");
+        std::filesystem::create_directories(folder + "/playlists");
     }
-    ~Personal() override { std::filesystem::remove_all(folder); }
 
     std::string path(const std::string &name) const { return folder + "/playlists/" + name; }
     void make(const std::vector<std::string> &names) const {
         for (const std::string &name : names) {
-            std::ofstream(path(name)) << "#EXTM3U\r\n";
+            files::write(path(name), "#EXTM3U\r\n");
         }
     }
     std::string line(int id, const std::string &title) const {
         return std::to_string(id) + " " + title + " " + title + " " + path(title + ".m3u") + "\n";
     }
 
-    std::string folder;
+  private:
+    files::Folder temporary_;
+
+  protected:
+    const std::string folder = temporary_.path("user");
 };
 
 TEST_F(Personal, PagesOfMatchesByName) {

@@ -95,6 +95,10 @@ std::string takeTrace() {
     return std::exchange(theTrace, {});
 }
 
+std::string outcome(int result) {
+    return std::to_string(result) + " " + takeTrace();
+}
+
 int takeOpenResults() {
     const int count = static_cast<int>(openResults.size());
     openResults.clear();
@@ -173,12 +177,7 @@ int MediaInfoDBGet(MEDIA_DB_RESULT *result, ZANO_MEDIA_INFO *row) {
     if (open.nextRow == theScript.rows.size()) {
         return -1;
     }
-    const ZANO_MEDIA_INFO &next = theScript.rows[open.nextRow++];
-    if (theScript.onlyIdsAreWritten) {
-        row->id = next.id;
-    } else {
-        *row = next;
-    }
+    *row = theScript.rows[open.nextRow++];
     return 0;
 }
 

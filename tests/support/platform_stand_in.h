@@ -27,7 +27,6 @@ struct Script {
     int rowCount = 0;  // the fourth field of a result
     int count = 0;     // the answer of MediaInfoDBGetCount
     bool openFails = false;
-    bool onlyIdsAreWritten = false;  // MediaInfoDBGet leaves the rest of a record alone
     std::string musicRoot = "/volume1/music";
     int linkError = 0;  // errno of a music link that cannot be read
     bool quotesFail = false;
@@ -52,6 +51,9 @@ Script &script();
 /* The calls since the last one, a line feed behind each. A program that the library starts is not
  * run; its line is: exec PROGRAM "first" "second". */
 std::string takeTrace();
+
+/* The result of a call and a blank, and the calls and lines of it: "-1 3 musiclib.cpp (84) ..." */
+std::string outcome(int result);
 
 /* The number of results that were opened and not closed; counts from 0 again after it. */
 int takeOpenResults();
