@@ -31,9 +31,11 @@ const char *textOf(const xmlChar *text) {
     return text != nullptr ? reinterpret_cast<const char *>(text) : "";
 }
 
-/* Of the first child alone: an element without text in front of its own children has none. */
+/* Of the first child alone: an element without text in front of its own children has none. Nor has
+ * an entity: a long one that is used often would grow beyond all that was sent. */
 const char *contentOf(const xmlNode *child) {
-    return child != nullptr ? textOf(child->content) : "";
+    const bool isText = child != nullptr && child->type != XML_ENTITY_REF_NODE;
+    return isText ? textOf(child->content) : "";
 }
 
 /* As strtol gives it where a long has 32 bits. */

@@ -45,9 +45,9 @@ class VORELIX_API ItemList : public std::list<ItemNode *> {
 /* A container, an item or a resource. The keys are names without their namespace prefix: first the
  * element's attributes ("id", "parentID", "childCount"), then its child elements but `res`
  * ("title", "creator", "class"), whose own attributes are left out. The first value of a key
- * stays. The value is the text; "" when there is none, or an element or a comment in its place.
- * A resource has its address under "res" and its attributes ("protocolInfo", "size",
- * "duration"). */
+ * stays. The value is what stands first in the element, its text as a rule; "" when that is
+ * nothing, an element or an entity. A resource has its address under "res" and its attributes
+ * ("protocolInfo", "size", "duration"). */
 class VORELIX_API ItemNode : public std::map<std::string, std::string> {
   public:
     ItemNode();
