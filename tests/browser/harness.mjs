@@ -76,6 +76,7 @@ export const button = (scope, name) => scope.getByRole('button', { name, exact: 
 // Asks the server as a program does, past the page.
 export async function ask(page, action, parameters = {}, method = 'get') {
     const data = method === 'get' ? { params: { action, ...parameters } } : { form: { action, ...parameters } };
+    data.maxRetries = 2; // The server may end an idle connection just when it is used again.
     const answer = await (await page.request[method](`${base}webapi`, data)).json();
     assert.equal(answer.success, true, JSON.stringify(answer));
     return answer;
