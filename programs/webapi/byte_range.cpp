@@ -47,13 +47,13 @@ ByteRange byteRangeOf(std::string_view range, std::int64_t size) {
     if (range.size() < kUnit.size() || strncasecmp(range.data(), kUnit.data(), kUnit.size()) != 0) {
         return kAll;
     }
-    const std::string_view spec = withoutBlanks(range.substr(kUnit.size()));
-    const std::size_t dash = spec.find('-');
+    const std::string_view bounds = withoutBlanks(range.substr(kUnit.size()));
+    const std::size_t dash = bounds.find('-');
     if (dash == std::string_view::npos) {
         return kAll;
     }
-    const std::string_view first = spec.substr(0, dash);
-    const std::string_view last = spec.substr(dash + 1);
+    const std::string_view first = bounds.substr(0, dash);
+    const std::string_view last = bounds.substr(dash + 1);
     if (!isNumber(first) || !isNumber(last) || (first.empty() && last.empty())) {
         return kAll;  // several ranges too: the comma is no digit
     }
