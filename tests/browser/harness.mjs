@@ -91,6 +91,8 @@ export const withPlaylist = (title, names, work, options) => withPage(async (pag
         await open(page, `#/playlist?id=${id}`);
         await work(page, id);
     } finally {
+        // What the page still asks about the playlist would find it gone.
+        await page.goto('about:blank');
         await ask(page, 'playlist-delete', { id }, 'post');
     }
 }, options);

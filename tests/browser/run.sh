@@ -46,7 +46,7 @@ printf 'mediadb="sqlite:%s"\nrunvorelix="yes"\n' "$WORK/media.db" >"$ROOT/usr/za
 "$ZANOINDEX" "$music"
 
 export VORELIX_USER=admin VORELIX_WEBAPI="$WEBAPI" VORELIX_PAGE="$SOURCE/programs/webapi/page" \
-    VORELIX_ERRORS="$SOURCE/programs/webapi/lighttpd" VORELIX_PORT
+    VORELIX_ERRORS="${WEBAPI%/*}/errors" VORELIX_PORT
 VORELIX_PORT=$(node -e 'const s = require("net").createServer().listen(0, "127.0.0.1", () => {
     console.log(s.address().port); s.close(); })')
 lighttpd -D -f "$SOURCE/programs/webapi/lighttpd/local.conf" 2>"$WORK/lighttpd.log" &
