@@ -5,6 +5,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "../query/statements.h"
 #include "../row_record.h"
 #include "conditions.h"
 #include "plan.h"
@@ -112,42 +113,11 @@ class PlaylistCursor : public StatementCursor {
   public:
     PlaylistCursor(ReaderPool::Lease lease, Query asked)
         : StatementCursor(std::move(lease), std::move(asked)) {
-        Sql sql = newSql("SELECT ");
-        sql.add(columnList(query().select, "")).add(" FROM playlists");
-        if (query().distinct) {
-            sql.add(" WHERE id IN (SELECT min(id) FROM playlists");
-            addWhere(sql);
-            sql.add(" GROUP BY ").add(columnInfo(*query().distinct).name).add(")");
-        } else {
-            addWhere(sql);
-        }
-        sql.add(" ORDER BY ");
-        if (query().random) {
-            sql.add("random()");
-        } else {
-            addFullOrder(sql, query().order, "");
-        }
-        addPage(sql, query().offset, query().limit);
-        setSql(sql);
+        setSql(playlistPage(dialect(), columnList(query().select, ""), query()));
     }
 
     std::int64_t countAll() override {
-        Sql sql = newSql("SELECT count(");
-        if (query().distinct) {
-            sql.add("DISTINCT ").add(columnInfo(*query().distinct).name);
-        } else {
-            sql.add("*");
-        }
-        addWhere(sql.add(") FROM playlists"));
-        return connection().integer(sql);
-    }
-
-  private:
-    void addWhere(Sql &sql) const {
-        if (query().condition) {
-            sql.add(" WHERE ");
-            sql.addCondition(*query().condition, "");
-        }
+        return connection().integer(playlistCount(dialect(), query()));
     }
 };
 

@@ -108,7 +108,7 @@ void ignoreNotice(void *, const PGresult *) {}
 const Dialect &dialect() {
     static constexpr Dialect kDialect{'$',      true,        "",           "",         "zano_lower",
                                       "length", "",          "",           "::bigint", "::float8",
-                                      "::text", "zano_text", "::bigint[]", true};
+                                      "::text", "zano_text", "::bigint[]", true,       "ALL"};
     return kDialect;
 }
 

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "../query/statements.h"
 #include "../row_record.h"
 
 namespace zano::mediadb::postgresql {
@@ -91,23 +92,6 @@ void addStretch(Sql &sql, const Place &place, bool isSameValue, std::int64_t row
 
 }  // namespace
 
-void addPage(Sql &sql, std::int64_t offset, std::int64_t limit) {
-    if (limit > 0) {
-        sql.add(" LIMIT ").bind(limit);
-    }
-    if (offset > 0) {
-        sql.add(" OFFSET ").bind(offset);
-    }
-}
-
-void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier) {
-    if (!order.empty()) {
-        sql.addOrder(order, qualifier);
-        sql.add(", ");
-    }
-    sql.add(qualifier).add("id");
-}
-
 SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
     : reader_(reader), conjuncts_(conjunctsOf(condition)) {
     /* A prefix that all paths have costs a comparison for each row, and counts would have to
@@ -160,7 +144,7 @@ std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &que
     addStretch(sql.add(" FROM ("), place, true, skipped + query.limit);
     addStretch(sql.add(" UNION ALL "), place, false, skipped + query.limit);
     sql.add(") AS songs ORDER BY stretch, ").add(orderText(order.leading, ""));
-    addPage(sql, skipped, query.limit);
+    sql.addPage(skipped, query.limit);
     return sql;
 }
 
@@ -180,9 +164,9 @@ Sql SongPlan::page(const Query &query) {
     } else if (leading) {
         sql.add(orderText(*leading, "songs."));
     } else {
-        addFullOrder(sql, query.order, "songs.");
+        sql.addFullOrder(query.order, "songs.");
     }
-    addPage(sql, query.offset, query.limit);
+    sql.addPage(query.offset, query.limit);
     return sql;
 }
 
@@ -201,24 +185,15 @@ Sql SongPlan::distinctPage(const Query &query) {
         const bool isDescending = !query.order.empty() && query.order[0].descending;
         sql.add(", songs.").add(info.name).add(isDescending ? " DESC, songs.id" : ", songs.id");
     }
-    addPage(sql, query.offset, query.limit);
+    sql.addPage(query.offset, query.limit);
     return sql;
 }
 
 std::optional<Sql> SongPlan::facetPage(const Query &query) {
-    const bool asksForValues = query.distinct && !query.random && conjuncts_.empty() &&
-                               query.select.size() == 1 &&
-                               query.select[0].column == *query.distinct &&
-                               (query.order.empty() || query.order[0].column == *query.distinct);
-    const Facet *facet = asksForValues ? findFacet(*query.distinct) : nullptr;
-    if (facet == nullptr) {
-        return std::nullopt;
-    }
-    const bool isDescending = !query.order.empty() && query.order[0].descending;
-    Sql sql = newSql("SELECT name FROM facets WHERE facet=").bind(std::int64_t{facet->number});
-    sql.add(isDescending ? " ORDER BY key DESC, name DESC" : " ORDER BY key, name");
-    addPage(sql, query.offset, query.limit);
-    return sql;
+    const bool areWanted = conjuncts_.empty() && asksForValues(query);
+    const Facet *facet = areWanted ? findFacet(*query.distinct) : nullptr;
+    return facet != nullptr ? std::optional(valuePage(dialect(), facet->number, query))
+                            : std::nullopt;
 }
 
 std::int64_t SongPlan::countOutside(const std::string &prefix, std::int64_t bound) {

@@ -39,8 +39,4 @@ class SongPlan {
     std::vector<Conjunct> conjuncts_;
 };
 
-void addPage(Sql &sql, std::int64_t offset, std::int64_t limit);
-/* Ties are broken by id. */
-void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier);
-
 }  // namespace zano::mediadb::postgresql

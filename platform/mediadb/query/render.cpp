@@ -152,6 +152,25 @@ void Sql::addOrder(const std::vector<OrderTerm> &order, std::string_view qualifi
     }
 }
 
+void Sql::addFullOrder(const std::vector<OrderTerm> &order, std::string_view qualifier) {
+    addOrder(order, qualifier);
+    add(order.empty() ? "" : ", ").add(qualifier).add("id");
+}
+
+/* With both values where there is one, so that the pages of a listing are one statement. */
+void Sql::addPage(std::int64_t offset, std::int64_t limit) {
+    if (offset <= 0 && limit <= 0) {
+        return;
+    }
+    add(" LIMIT ");
+    if (limit > 0) {
+        bind(limit);
+    } else {
+        add(dialect_->unlimited);
+    }
+    add(" OFFSET ").bind(offset);
+}
+
 void Sql::addPathRange(std::string_view prefix, std::string_view qualifier) {
     add("(").add(qualifier).add("path >= ").bind(std::string(prefix));
     if (auto end = endOfPrefix(prefix)) {

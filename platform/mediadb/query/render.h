@@ -36,6 +36,8 @@ struct Dialect {
     std::string_view integerArrayCast;
     /* Every text column has a folded key, "column_key", for it has no function that makes one. */
     bool allTextsHaveKeys;
+    /* What stands behind LIMIT where there is an OFFSET alone. */
+    std::string_view unlimited;
 };
 
 /* A statement being put together: its text and its values. */
@@ -61,6 +63,10 @@ class Sql {
     void addPathRange(std::string_view prefix, std::string_view qualifier);
     /* Columns with their folded keys where they have one. */
     void addOrder(const std::vector<OrderTerm> &order, std::string_view qualifier);
+    /* The same, with ties broken by id. */
+    void addFullOrder(const std::vector<OrderTerm> &order, std::string_view qualifier);
+    /* LIMIT and OFFSET; nothing when both are 0. */
+    void addPage(std::int64_t offset, std::int64_t limit);
 
     const std::string &text() const { return text_; }
     const std::vector<Value> &values() const { return values_; }

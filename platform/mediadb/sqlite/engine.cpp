@@ -5,6 +5,7 @@
 #include <unordered_set>
 #include <utility>
 
+#include "../query/statements.h"
 #include "../row_record.h"
 #include "plan.h"
 #include "reader.h"
@@ -76,7 +77,7 @@ class SongCursor : public StatementCursor {
     SongCursor(ReaderPool::Lease lease, Query asked)
         : StatementCursor(std::move(lease), std::move(asked)), plan_(reader(), query().condition) {
         if (const Facet *facet = facetOfQuery()) {
-            setSql(facetPage(*facet));
+            setSql(valuePage(dialect(), facet->number, query()));
         } else {
             const std::string columns = columnList(query().select, "songs.");
             setSql(query().distinct ? plan_.distinctPage(columns, query())
@@ -87,13 +88,9 @@ class SongCursor : public StatementCursor {
     std::int64_t countAll() override { return plan_.count(query().distinct); }
 
   private:
-    /* The kept values serve a query for nothing but one column's values, sorted by them. */
+    /* Null where the values that are kept do not serve. */
     const Facet *facetOfQuery() {
-        const bool asksForValues =
-            query().distinct && plan_.isUnconditional() && reader().state().isOrdered &&
-            query().select.size() == 1 && query().select[0].column == *query().distinct &&
-            (query().order.empty() || query().order[0].column == *query().distinct);
-        if (!asksForValues) {
+        if (!plan_.isUnconditional() || !reader().state().isOrdered || !asksForValues(query())) {
             return nullptr;
         }
         const auto &rows = facets();
@@ -103,16 +100,6 @@ class SongCursor : public StatementCursor {
         return row == rows.end() ? nullptr : &*row;
     }
 
-    Sql facetPage(const Facet &facet) {
-        const bool isDescending = !query().order.empty() && query().order[0].descending;
-        Sql sql(dialect());
-        sql.add("SELECT name FROM facets WHERE facet=").bind(std::int64_t{facet.number});
-        sql.add(isDescending ? " ORDER BY key DESC, name DESC" : " ORDER BY key, name");
-        sql.add(" LIMIT ").bind(query().limit > 0 ? query().limit : std::int64_t{-1});
-        sql.add(" OFFSET ").bind(query().offset);
-        return sql;
-    }
-
     SongPlan plan_;
 };
 
@@ -120,46 +107,10 @@ class PlaylistCursor : public StatementCursor {
   public:
     PlaylistCursor(ReaderPool::Lease lease, Query asked)
         : StatementCursor(std::move(lease), std::move(asked)) {
-        Sql sql(dialect());
-        sql.add("SELECT ").add(columnList(query().select, "")).add(" FROM playlists");
-        if (query().distinct) {
-            sql.add(" WHERE id IN (SELECT min(id) FROM playlists");
-            addWhere(sql);
-            sql.add(" GROUP BY ").add(columnInfo(*query().distinct).name).add(")");
-        } else {
-            addWhere(sql);
-        }
-        sql.add(" ORDER BY ");
-        if (query().random) {
-            sql.add("random()");
-        } else {
-            addFullOrder(sql, query().order, "");
-        }
-        sql.add(" LIMIT ").bind(query().limit > 0 ? query().limit : std::int64_t{-1});
-        sql.add(" OFFSET ").bind(query().offset);
-        setSql(std::move(sql));
+        setSql(playlistPage(dialect(), columnList(query().select, ""), query()));
     }
 
-    std::int64_t countAll() override {
-        Sql sql(dialect());
-        sql.add("SELECT count(");
-        if (query().distinct) {
-            sql.add("DISTINCT ").add(columnInfo(*query().distinct).name);
-        } else {
-            sql.add("*");
-        }
-        sql.add(") FROM playlists");
-        addWhere(sql);
-        return reader().integer(sql);
-    }
-
-  private:
-    void addWhere(Sql &sql) const {
-        if (query().condition) {
-            sql.add(" WHERE ");
-            sql.addCondition(*query().condition, "");
-        }
-    }
+    std::int64_t countAll() override { return reader().integer(playlistCount(dialect(), query())); }
 };
 
 /* Songs in random order. A few of many are drawn by their ids, without a look at the others. */

@@ -33,16 +33,8 @@ const Dialect &dialect() {
         '?',          false,    "instr",     "zano_fold",
         "zano_lower", "length", "zano_like", "SELECT value FROM json_each",
         "",           "",       "",          "",
-        "",           false};
+        "",           false,    "-1"};
     return kDialect;
-}
-
-void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier) {
-    if (!order.empty()) {
-        sql.addOrder(order, qualifier);
-        sql.add(", ");
-    }
-    sql.add(qualifier).add("id");
 }
 
 SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
@@ -105,13 +97,6 @@ void SongPlan::addSource(Sql &sql, bool withGrams) {
     addWhere(sql, withGrams);
 }
 
-void SongPlan::addPage(Sql &sql, Page page) {
-    if (page.limit > 0 || page.offset > 0) {
-        sql.add(" LIMIT ").bind(page.limit > 0 ? page.limit : std::int64_t{-1});
-        sql.add(" OFFSET ").bind(page.offset);
-    }
-}
-
 /* The rank at which a walk for a common word should give way to the index; null for rare ones.
  * Walking costs a row for each song but needs no start; the index must find where the lists of
  * all tokens meet. */
@@ -146,7 +131,7 @@ Sql SongPlan::stream(std::string_view columns, Page page) {
         sql.add(" AND grams.rowid>=").bind(*end);
     }
     sql.add(end ? " ORDER BY grams.rowid)" : " ORDER BY grams.rowid");
-    addPage(sql, page);
+    sql.addPage(page.offset, page.limit);
     return sql;
 }
 
@@ -155,7 +140,7 @@ Sql SongPlan::candidates(std::string_view columns, const StoredOrder &order, Pag
     addSource(sql, true);
     /* The signs keep SQLite from walking an index of the order instead. */
     sql.add(" ORDER BY ").add(orderText(order, "+songs."));
-    addPage(sql, page);
+    sql.addPage(page.offset, page.limit);
     return sql;
 }
 
@@ -171,7 +156,7 @@ Sql SongPlan::walk(std::string_view columns, const StoredOrder &order, Page page
     Sql sql = newSql("");
     addWalk(sql, columns, order);
     sql.add(" ORDER BY ").add(orderText(order, "songs."));
-    addPage(sql, page);
+    sql.addPage(page.offset, page.limit);
     return sql;
 }
 
@@ -195,7 +180,7 @@ std::optional<Sql> SongPlan::anchored(std::string_view columns, const StoredOrde
     sql.add(place).add(" FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
     sql.bind(std::int64_t{order.number}).add(" AND place=");
     sql.bind(page.offset / kAnchorDistance).add(")) ORDER BY ").add(orderText(order, "songs."));
-    addPage(sql, {page.offset % kAnchorDistance, page.limit});
+    sql.addPage(page.offset % kAnchorDistance, page.limit);
     return sql;
 }
 
@@ -224,9 +209,9 @@ Sql SongPlan::page(std::string_view columns, const Query &query) {
     if (stored != nullptr) {
         sql.add(orderText(*stored, "songs."));
     } else {
-        addFullOrder(sql, order, "songs.");
+        sql.addFullOrder(order, "songs.");
     }
-    addPage(sql, page);
+    sql.addPage(page.offset, page.limit);
     return sql;
 }
 
@@ -241,7 +226,7 @@ Sql SongPlan::distinctPage(std::string_view columns, const Query &query) {
                  "songs.");
     const bool isDescending = !query.order.empty() && query.order[0].descending;
     sql.add(", songs.").add(info.name).add(isDescending ? " DESC, songs.id" : ", songs.id");
-    addPage(sql, {query.offset, query.limit});
+    sql.addPage(query.offset, query.limit);
     return sql;
 }
 

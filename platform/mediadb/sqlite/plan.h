@@ -51,7 +51,6 @@ class SongPlan {
     void addSource(Sql &sql, bool withGrams);
     void addWalk(Sql &sql, std::string_view columns, const StoredOrder &order);
     void addMatch(Sql &sql);
-    void addPage(Sql &sql, Page page);
     Sql stream(std::string_view columns, Page page);
     std::optional<std::int64_t> endOfWalk(Page page);
     Sql candidates(std::string_view columns, const StoredOrder &order, Page page);
@@ -64,9 +63,6 @@ class SongPlan {
     std::vector<bool> answered_;  // by the search index alone, for each conjunct
     std::vector<SearchTerm> terms_;
 };
-
-/* ORDER BY text for an order without an index; ties are broken by id. */
-void addFullOrder(Sql &sql, const std::vector<OrderTerm> &order, std::string_view qualifier);
 
 /* How many entries of an order lie between two anchors. */
 constexpr std::int64_t kAnchorDistance = 128;
