@@ -12,8 +12,8 @@
 #include <array>
 #include <cstdio>
 #include <functional>
+#include <optional>
 #include <random>
-#include <stdexcept>
 
 #include "raw.h"
 #include "report.h"
@@ -294,22 +294,11 @@ class Questions {
 }  // namespace zano::bench
 
 int main(int argc, char **argv) {
-    if (argc < 2 || argv[1][0] == '-') {
-        std::fputs("usage: library_bench CATALOGUE [options of Google Benchmark]\n", stderr);
-        return 2;
-    }
-    try {
-        zano::bench::prepareRoot(argv[1]);
-        zano::bench::Questions questions(argv[1]);
-        questions.addAll();
-        argv[1] = argv[0];
-        int count = argc - 1;
-        benchmark::Initialize(&count, argv + 1);
-        zano::bench::RatioReporter reporter;
-        benchmark::RunSpecifiedBenchmarks(&reporter);
-        return 0;
-    } catch (const std::exception &error) {
-        std::fprintf(stderr, "library_bench: %s\n", error.what());
-        return 1;
-    }
+    std::optional<zano::bench::Questions> questions;
+    return zano::bench::runComparison(argc, argv, "library_bench",
+                                      [&questions](const std::string &catalogue) {
+                                          zano::bench::prepareRoot(catalogue);
+                                          questions.emplace(catalogue);
+                                          questions->addAll();
+                                      });
 }

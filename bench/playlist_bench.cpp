@@ -25,6 +25,7 @@
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "report.h"
 #include "root.h"
@@ -176,29 +177,16 @@ class Playlists {
 }  // namespace zano::bench
 
 int main(int argc, char **argv) {
-    if (argc < 2 || argv[1][0] == '-') {
-        std::fputs("usage: playlist_bench CATALOGUE [options of Google Benchmark]\n", stderr);
-        return 2;
-    }
-    try {
-        using zano::bench::Playlists;
-        const std::string root = zano::bench::prepareRoot(argv[1]);
-        const auto folderOf = [&root](const char *name) {
-            std::filesystem::create_directories(root + "/" + name);
-            return root + "/" + name;
-        };
-        Playlists tens(10000, folderOf("ten"));
-        Playlists hundreds(100000, folderOf("hundred"));
-        tens.addAll();
-        hundreds.addAll();
-        argv[1] = argv[0];
-        int count = argc - 1;
-        benchmark::Initialize(&count, argv + 1);
-        zano::bench::RatioReporter reporter;
-        benchmark::RunSpecifiedBenchmarks(&reporter);
-        return 0;
-    } catch (const std::exception &error) {
-        std::fprintf(stderr, "playlist_bench: %s\n", error.what());
-        return 1;
-    }
+    using zano::bench::Playlists;
+    std::vector<std::unique_ptr<Playlists>> lists;
+    return zano::bench::runComparison(
+        argc, argv, "playlist_bench", [&lists](const std::string &catalogue) {
+            const std::string root = zano::bench::prepareRoot(catalogue);
+            for (const int entries : {10000, 100000}) {
+                const std::string folder = root + "/" + std::to_string(entries);
+                std::filesystem::create_directories(folder);
+                lists.push_back(std::make_unique<Playlists>(entries, folder));
+                lists.back()->addAll();
+            }
+        });
 }

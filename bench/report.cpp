@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <exception>
 #include <limits>
 
 namespace zano::bench {
@@ -59,6 +60,26 @@ void RatioReporter::Finalize() {
         const double library = leastOf(times.library);
         std::printf("| %s | %.1f | %.1f | %.2f |\n", question.c_str(), library, best,
                     library / best);
+    }
+}
+
+int runComparison(int argc, char **argv, const char *name,
+                  const std::function<void(const std::string &catalogue)> &add) {
+    if (argc < 2 || argv[1][0] == '-') {
+        std::fprintf(stderr, "usage: %s CATALOGUE [options of Google Benchmark]\n", name);
+        return 2;
+    }
+    try {
+        add(argv[1]);
+        argv[1] = argv[0];
+        int count = argc - 1;
+        benchmark::Initialize(&count, argv + 1);
+        RatioReporter reporter;
+        benchmark::RunSpecifiedBenchmarks(&reporter);
+        return 0;
+    } catch (const std::exception &error) {
+        std::fprintf(stderr, "%s: %s\n", name, error.what());
+        return 1;
     }
 }
 

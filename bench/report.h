@@ -3,6 +3,7 @@
 
 #include <benchmark/benchmark.h>
 
+#include <functional>
 #include <map>
 #include <string>
 #include <vector>
@@ -25,5 +26,10 @@ class RatioReporter : public benchmark::BenchmarkReporter {
     std::vector<std::string> questions_;
     std::map<std::string, Times> times_;
 };
+
+/* The main function of a program "NAME CATALOGUE [Google Benchmark's options]": add(catalogue)
+ * registers the benchmarks, which then run and are reported. The exit status. */
+int runComparison(int argc, char **argv, const char *name,
+                  const std::function<void(const std::string &catalogue)> &add);
 
 }  // namespace zano::bench
