@@ -1,19 +1,19 @@
 #include <vorelix/users/audiousers.h>
 
-#include "files.h"
 #include "support/failing_allocator.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 
 namespace {
 
-using namespace users_test;
+using files::Folder;
 
 class UsersOutOfMemory : public stand_in::Test {};
 
 TEST_F(UsersOutOfMemory, AFileThatFindsNoRoomIsNotRead) {
     const Folder folder;
     const std::string text(7777, ' ');
-    writeFile(folder.path("users"), text + "{}");
+    files::write(folder.path("users"), text + "{}");
     AudioUsers users;
     failing_allocator::failOnSize(text.size() + 3);
     EXPECT_FALSE(users.Read(folder.path("users")));

@@ -3,23 +3,24 @@
 #include <initializer_list>
 #include <utility>
 
-#include "files.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 #include "system_paths_internal.h"
 
 namespace {
 
-using namespace users_test;
+namespace fs = std::filesystem;
+using files::Folder;
 
 /* A store that holds a text. */
 struct Store : AudioUsers {
     explicit Store(const std::string &text) {
-        writeFile(folder.path("users"), text);
+        files::write(folder.path("users"), text);
         EXPECT_TRUE(Read(folder.path("users"))) << text;
     }
     std::string saved() {
         EXPECT_TRUE(Save(folder.path("saved")));
-        return readFile(folder.path("saved"));
+        return files::read(folder.path("saved"));
     }
     Folder folder;
 };
@@ -102,16 +103,17 @@ TEST_F(Permissions, OfANameNeedThePrivilegeAndTheFile) {
                 EXPECT_EQ(AudioUsers::GetUserPermission(name), mask) << name;
             }
         };
-    writeFile(ZANO_PATH_PASSWD,
-              "admin:x:1024:1:::\nann:x:1026:1:::\nbob:x:1027:1:::\nadministrator:x:1028:1:::\n"
-              "carl:x:1029:1:::\nboss:x:1024:1:::\n");
-    writeFile(ZANO_PATH_GROUP,
-              "Other:x:1:carl\nZANO.VXT.Vorelix.Application:x:2:ann,bob,administrator,gone,boss\n");
+    files::write(ZANO_PATH_PASSWD,
+                 "admin:x:1024:1:::\nann:x:1026:1:::\nbob:x:1027:1:::\nadministrator:x:1028:1:::\n"
+                 "carl:x:1029:1:::\nboss:x:1024:1:::\n");
+    files::write(
+        ZANO_PATH_GROUP,
+        "Other:x:1:carl\nZANO.VXT.Vorelix.Application:x:2:ann,bob,administrator,gone,boss\n");
     expectEach({{"admin", 31}, {"ADmIN", 31}, {"ann", 0}, {"administrator", 0}});
     EXPECT_EQ(stand_in::takeTrace(), "") << "a missing file is no failure";
 
-    writeFile(ZANO_PATH_AUDIO_USERS,
-              R"({"1024":{},"1026":{"usb":true},"1028":{"upnp":true},"1029":{"usb":true}})");
+    files::write(ZANO_PATH_AUDIO_USERS,
+                 R"({"1024":{},"1026":{"usb":true},"1028":{"upnp":true},"1029":{"usb":true}})");
     expectEach({{"admin", 31},
                 {"ann", 1},
                 {"bob", 2},
@@ -123,7 +125,7 @@ TEST_F(Permissions, OfANameNeedThePrivilegeAndTheFile) {
                 {"ádmin", 0}});
     EXPECT_EQ(stand_in::takeTrace(), "");
 
-    writeFile(ZANO_PATH_AUDIO_USERS, "{");
+    files::write(ZANO_PATH_AUDIO_USERS, "{");
     expectEach({{"Admin", 31}});
     EXPECT_EQ(stand_in::takeTrace(), "") << "the file is not read for the administrator";
     expectEach({{"ann", 0}});
@@ -131,19 +133,19 @@ TEST_F(Permissions, OfANameNeedThePrivilegeAndTheFile) {
 }
 
 TEST_F(Permissions, OfUsersThatAreGoneAreSynchronised) {
-    writeFile(ZANO_PATH_PASSWD, "ann:x:12:1:::\nbob:x:13:1:::\n");
-    writeFile(ZANO_PATH_AUDIO_USERS, R"({"12":{},"13":{},"14":{},"0":{},"x":1})");
+    files::write(ZANO_PATH_PASSWD, "ann:x:12:1:::\nbob:x:13:1:::\n");
+    files::write(ZANO_PATH_AUDIO_USERS, R"({"12":{},"13":{},"14":{},"0":{},"x":1})");
     AudioUsers::SyncUsers();
-    EXPECT_EQ(readFile(ZANO_PATH_AUDIO_USERS),
+    EXPECT_EQ(files::read(ZANO_PATH_AUDIO_USERS),
               "{\n   \"0\" : {},\n   \"12\" : {},\n   \"13\" : {},\n   \"x\" : 1\n}\n");
-    writeFile(ZANO_PATH_AUDIO_USERS, "{ \"12\":{} }");
+    files::write(ZANO_PATH_AUDIO_USERS, "{ \"12\":{} }");
     AudioUsers::SyncUsers();
-    EXPECT_EQ(readFile(ZANO_PATH_AUDIO_USERS), "{\n   \"12\" : {}\n}\n") << "written always";
+    EXPECT_EQ(files::read(ZANO_PATH_AUDIO_USERS), "{\n   \"12\" : {}\n}\n") << "written always";
 
     for (const char *broken : {"{\"14\":", "[]", ""}) {
-        writeFile(ZANO_PATH_AUDIO_USERS, broken);
+        files::write(ZANO_PATH_AUDIO_USERS, broken);
         AudioUsers::SyncUsers();
-        EXPECT_EQ(readFile(ZANO_PATH_AUDIO_USERS), broken);
+        EXPECT_EQ(files::read(ZANO_PATH_AUDIO_USERS), broken);
     }
     fs::remove(ZANO_PATH_AUDIO_USERS);
     AudioUsers::SyncUsers();
@@ -166,13 +168,13 @@ TEST_F(Permissions, AreSeededOnceForTheUsersThatExist) {
     };
     for (const auto &[passwd, seeded] : cases) {
         fs::remove(ZANO_PATH_AUDIO_USERS);
-        writeFile(ZANO_PATH_PASSWD, passwd);
+        files::write(ZANO_PATH_PASSWD, passwd);
         AudioUsers::InitUserPermission();
-        EXPECT_EQ(readFile(ZANO_PATH_AUDIO_USERS), seeded);
+        EXPECT_EQ(files::read(ZANO_PATH_AUDIO_USERS), seeded);
     }
-    writeFile(ZANO_PATH_AUDIO_USERS, "");
+    files::write(ZANO_PATH_AUDIO_USERS, "");
     AudioUsers::InitUserPermission();
-    EXPECT_EQ(readFile(ZANO_PATH_AUDIO_USERS), "");
+    EXPECT_EQ(files::read(ZANO_PATH_AUDIO_USERS), "");
 }
 
 }  // namespace

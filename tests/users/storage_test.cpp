@@ -13,7 +13,7 @@
 #include <thread>
 #include <utility>
 
-#include "files.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 
 namespace {
@@ -34,7 +34,8 @@ extern "C" __attribute__((visibility("default"))) ssize_t write(int file, const 
 
 namespace {
 
-using namespace users_test;
+namespace fs = std::filesystem;
+using files::Folder;
 
 class UsersFile : public stand_in::Test {
   protected:
@@ -45,16 +46,16 @@ class UsersFile : public stand_in::Test {
 std::string asText(AudioUsers &users) {
     const Folder folder;
     EXPECT_TRUE(users.Save(folder.path("users")));
-    return readFile(folder.path("users"));
+    return files::read(folder.path("users"));
 }
 
 TEST_F(UsersFile, IsReplacedWholeAndForAllToRead) {
     AudioUsers users;
     users.SetUser(1024, 31);
-    writeFile(path_, "before");
+    files::write(path_, "before");
     EXPECT_TRUE(users.Save(path_));
     EXPECT_EQ(
-        readFile(path_),
+        files::read(path_),
         "{\n   \"1024\" : {\n      \"editsong\" : true,\n      \"playlist\" : true,\n"
         "      \"streaming\" : true,\n      \"upnp\" : true,\n      \"usb\" : true\n   }\n}\n");
     EXPECT_FALSE(fs::exists(path_ + ".tmp"));
@@ -67,7 +68,7 @@ TEST_F(UsersFile, IsReplacedWholeAndForAllToRead) {
 
 TEST_F(UsersFile, StaysWhenItCannotBeWritten) {
     AudioUsers users;
-    writeFile(path_, "before");
+    files::write(path_, "before");
     fs::create_symlink("/dev/full", path_ + ".tmp");
     EXPECT_FALSE(users.Save(path_));
     EXPECT_EQ(stand_in::takeTrace(),
@@ -79,12 +80,12 @@ TEST_F(UsersFile, StaysWhenItCannotBeWritten) {
     EXPECT_FALSE(users.Save(path_));
     EXPECT_EQ(stand_in::takeTrace(),
               "3 audiousers (153) Failed to open " + path_ + ".tmp. (Is a directory)\n");
-    EXPECT_EQ(readFile(path_), "before");
+    EXPECT_EQ(files::read(path_), "before");
 
     const std::string folder = folder_.path("folder");
     fs::create_directory(folder);
     EXPECT_TRUE(users.Save(folder)) << "the result of the rename is not asked";
-    EXPECT_EQ(readFile(folder + ".tmp"), "{}\n");
+    EXPECT_EQ(files::read(folder + ".tmp"), "{}\n");
 }
 
 TEST_F(UsersFile, IsNotWrittenThroughDescriptorZero) {
@@ -119,7 +120,7 @@ TEST_F(UsersFile, ThatCannotBeReadLeavesTheStoreAsItWas) {
     users.SetUser(5, 1);
     const std::string before = asText(users);
     for (const auto &each : cases) {
-        writeFile(path_, each.text);
+        files::write(path_, each.text);
         EXPECT_FALSE(users.Read(path_)) << each.text.substr(0, 20);
         EXPECT_TRUE(stand_in::takeTrace().starts_with(each.trace)) << each.text.substr(0, 20);
         EXPECT_EQ(asText(users), before);
@@ -141,7 +142,7 @@ TEST_F(UsersFile, MayHoldAMebibyteCommentsAndANul) {
     std::string text = "// by hand\n{\"12\":{\"usb\":true}}";
     text.append(kLimit - text.size(), ' ');
     for (const std::string &each : {text, std::string("{\"12\":{\"usb\":true}}\0junk", 24)}) {
-        writeFile(path_, each);
+        files::write(path_, each);
         AudioUsers users;
         users.SetUser(5, 1);
         EXPECT_TRUE(users.Read(path_));
@@ -178,10 +179,10 @@ TEST_F(UsersFile, OfAWriterKilledAmidItsWriteIsTheOneBefore) {
     int status = 0;
     ASSERT_EQ(waitpid(child, &status, 0), child);
     ASSERT_TRUE(WIFSIGNALED(status));
-    EXPECT_EQ(readFile(path_ + ".tmp").size(), two.texts[1].size() / 2);
-    EXPECT_TRUE(readFile(path_) == two.texts[0]);
+    EXPECT_EQ(files::read(path_ + ".tmp").size(), two.texts[1].size() / 2);
+    EXPECT_TRUE(files::read(path_) == two.texts[0]);
     EXPECT_TRUE(two.stores[1].Save(path_));
-    EXPECT_TRUE(readFile(path_) == two.texts[1]) << "the next save goes over what was left";
+    EXPECT_TRUE(files::read(path_) == two.texts[1]) << "the next save goes over what was left";
 }
 
 TEST_F(UsersFile, OfAWriterKilledAtAnyMomentIsOneOfTheTwo) {
@@ -203,7 +204,7 @@ TEST_F(UsersFile, OfAWriterKilledAtAnyMomentIsOneOfTheTwo) {
         std::this_thread::sleep_for(std::chrono::microseconds(delay(random)));
         ASSERT_EQ(::kill(child, SIGKILL), 0);
         ASSERT_EQ(waitpid(child, nullptr, 0), child);
-        const std::string text = readFile(path_);
+        const std::string text = files::read(path_);
         ASSERT_TRUE(text == two.texts[0] || text == two.texts[1])
             << "seed " << seed << ", kill " << kill << ": " << text.size() << " bytes";
     }

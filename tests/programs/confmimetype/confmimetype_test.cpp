@@ -1,10 +1,8 @@
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 #include <unistd.h>
 #include <vorelix/misc/misc.h>
 
 #include <array>
-#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <map>
@@ -12,6 +10,7 @@
 #include <sstream>
 #include <string>
 
+#include "support/process.h"
 #include "system_paths_internal.h"
 
 namespace {
@@ -20,15 +19,8 @@ namespace fs = std::filesystem;
 
 /* Exit status, a colon, and all that the program writes, errors first. */
 std::string run(const std::string &arguments) {
-    const std::string command = "'" CONFMIMETYPE "' " + arguments;
-    std::FILE *const output = popen(command.c_str(), "r");
-    std::string text;
-    std::array<char, 4096> part{};
-    for (size_t size = 1; size > 0;) {
-        size = std::fread(part.data(), 1, part.size(), output);
-        text.append(part.data(), size);
-    }
-    return std::to_string(WEXITSTATUS(pclose(output))) + ":" + text;
+    const process::Outcome outcome = process::run("'" CONFMIMETYPE "' " + arguments);
+    return std::to_string(outcome.status) + ":" + outcome.text;
 }
 
 std::string typeOf(const std::string &extension) {
