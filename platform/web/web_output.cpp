@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <limits>
 #include <string>
 #include <string_view>
 
@@ -29,6 +30,8 @@ std::string jsonText(const Json::Value &value) {
     writer["indentation"] = "";
     // As they are, for jsoncpp's own reading of UTF-8 loses what follows a wrong byte.
     writer["emitUTF8"] = true;
+    // A 5.1 as that, where 17 digits show what is nearest to it in binary.
+    writer["precision"] = std::numeric_limits<double>::digits10;
     std::string text = Json::writeString(writer, value);
     return zano::isUtf8(text) ? text : validUtf8(text);
 }

@@ -37,6 +37,9 @@ const std::map<std::string, Work> kActions{
          answer["songs"].append("Caf\xC3\xA9 <b>\"\x01");
          answer["songs"].append("bad \xE9\xFF\xC3\" end");
          answer["total"] = 2;
+         for (const double number : {5.1, 1.0 / 3, -0.1, 3.0, 123456789.123456, 1e21}) {
+             answer["numbers"].append(number);
+         }
          action.SetSuccess(answer, true);
      }},
     {"fail",

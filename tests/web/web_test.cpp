@@ -1,11 +1,10 @@
 #include <gtest/gtest.h>
 
-#include <array>
-#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <string>
 
+#include "support/process.h"
 #include "system_paths_internal.h"
 
 namespace {
@@ -19,15 +18,7 @@ std::string answerOf(const std::string &action) {
     const std::string program = ANSWER;
     const std::string command =
         "'" + program + "' " + action + " 2>&1 >'" + program + ".out'; cat '" + program + ".out'";
-    std::FILE *const output = popen(command.c_str(), "r");
-    std::string text;
-    std::array<char, 4096> part{};
-    for (size_t size = 1; size > 0;) {
-        size = std::fread(part.data(), 1, part.size(), output);
-        text.append(part.data(), size);
-    }
-    EXPECT_EQ(pclose(output), 0) << action;
-    return text;
+    return process::textOf(command);
 }
 
 class Answers : public testing::Test {
@@ -60,7 +51,8 @@ TEST_F(Answers, OfAServiceThatIsOffAreOneRefusal) {
 TEST_F(Answers, AreTheEnvelopeWithItsHeader) {
     const std::pair<const char *, const char *> cases[] = {
         {"list",
-         "{\"songs\":[\"Caf\xC3\xA9 <b>\\\"\\u0001\",\"bad \xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD"
+         "{\"numbers\":[5.1,0.333333333333333,-0.1,3.0,123456789.123456,1e+21],\"songs\":["
+         "\"Caf\xC3\xA9 <b>\\\"\\u0001\",\"bad \xEF\xBF\xBD\xEF\xBF\xBD\xEF\xBF\xBD"
          "\\\" end\"],\"success\":true,\"total\":2}"},
         {"fail",
          "{\"errno\":{\"key\":\"id\",\"line\":120,\"more\":true,\"section\":\"playlist\"},"

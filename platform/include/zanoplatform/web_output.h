@@ -21,7 +21,8 @@ class ZANOPLATFORM_API WebMan {
 
     /* The value on one line, without a line feed at its end, and all that was written before on
      * its way to the server. Texts are UTF-8; a byte that is not becomes U+FFFD, so that one bad
-     * file name does not cost the whole answer. Throws std::bad_alloc with nothing written. */
+     * file name does not cost the whole answer. Fractions have at most 15 significant digits, as
+     * many as every decimal keeps. Throws std::bad_alloc with nothing written. */
     void WriteBody(const Json::Value &body);
 
   private:
