@@ -1,8 +1,11 @@
 #include "folder_names.h"
 
+#include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
+#include <cerrno>
 #include <filesystem>
 
 #include "text.h"
@@ -12,6 +15,42 @@ namespace zano::playlists {
 bool isOnDisk(const std::string &path) {
     struct stat file {};
     return stat(path.c_str(), &file) == 0;
+}
+
+FileLookup::~FileLookup() {
+    if (descriptor_ != -1) {
+        close(descriptor_);
+    }
+}
+
+/* A single file of a folder costs less by its whole path. */
+void FileLookup::enter(std::string_view folder) {
+    if (descriptor_ != -1) {
+        close(descriptor_);
+        descriptor_ = -1;
+    }
+    if (folder == folder_) {
+        descriptor_ = open(folder_.c_str(), O_PATH | O_DIRECTORY | O_CLOEXEC);
+        isGone_ = descriptor_ == -1 && (errno == ENOENT || errno == ENOTDIR);
+    } else {
+        folder_ = folder;
+        isGone_ = false;
+    }
+}
+
+bool FileLookup::isThere(const std::string &path) {
+    const std::size_t end = path.rfind('/') + 1;
+    const std::string_view folder = std::string_view(path).substr(0, end);
+    if (folder != folder_ || (descriptor_ == -1 && !isGone_)) {
+        enter(folder);
+    }
+    struct stat file {};
+    if (isGone_) {
+        return false;
+    }
+    return descriptor_ == -1 || end == path.size()
+               ? isOnDisk(path)
+               : fstatat(descriptor_, path.c_str() + end, &file, 0) == 0;
 }
 
 std::optional<std::string> FolderNames::find(std::string_view path) {

@@ -143,12 +143,13 @@ void Resolver::lookUpAsTheyStand() {
 /* What the database does not know as it stands may be on the disk, and then it is meant. */
 std::vector<std::uint32_t> Resolver::entriesToSearch() {
     std::vector<std::uint32_t> entries;
+    FileLookup files;
     for (std::uint32_t entry = 0; entry < places_.size(); ++entry) {
         Place &place = places_[entry];
         if (place.isWeb || place.isFound || place.path.size() > kMaxPathBytes) {
             continue;
         }
-        place.isFound = isOnDisk(std::string(place.path));
+        place.isFound = files.isThere(std::string(place.path));
         if (!place.isFound && !playlist_.entries[entry].isOptional) {
             entries.push_back(entry);
         }
@@ -193,10 +194,12 @@ void Resolver::findOnDisk(std::span<const Wanted> readings, std::vector<Wanted> 
         places_[reading.entry].path = playlist_.texts.keep({path});
         places_[reading.entry].isFound = true;
     };
+    FileLookup files;
     for (const Wanted &reading : readings) {
-        const std::string path(reading.path);
-        if (!places_[reading.entry].isFound && isOnDisk(path)) {
-            settle(reading, path);
+        // The first reading, the location as it stands, has been looked at.
+        if (reading.reading > 0 && !places_[reading.entry].isFound &&
+            files.isThere(std::string(reading.path))) {
+            settle(reading, std::string(reading.path));
         }
     }
     for (const Wanted &reading : readings) {

@@ -58,6 +58,19 @@ TEST_F(ParserTest, OneSongInManyPlacesHasItsRowInEach) {
               "song ~/a & b.mp3|title of a & b.mp3|artist|||2001|0|0|61.5\n");
 }
 
+/* A line that begins with # is an entry when such a file is there. */
+TEST_F(ParserTest, FilesAreLookedForInEachFolderAnew) {
+    std::filesystem::create_directory(music() / "hash");
+    write("hash/#1.mp3", "");
+    write("hash/#3.mp3", "");
+    EXPECT_EQ(dump(write("hash/list.m3u",
+                         "#0.mp3\n#1.mp3\n#2.mp3\n#3.mp3\n#../gone/1.mp3\n#../gone/2.mp3\n"
+                         "#../gone/3.mp3\n#1.mp3\n#3.mp3/4.mp3\n#3.mp3/5.mp3\n#3.mp3/6.mp3\n"
+                         "#3.mp3\n#/\n#/\n#/\n")),
+              "     ~/hash/#1.mp3|||||0|0|0|0\n     ~/hash/#3.mp3|||||0|0|0|0\n"
+              "     ~/hash/#1.mp3|||||0|0|0|0\n     ~/hash/#3.mp3|||||0|0|0|0\n");
+}
+
 TEST_F(ParserTest, FieldsThatAreNotAskedForAreEmpty) {
     const std::string path = write("fields.m3u",
                                    "#EXTINF:5,Title\n#EXTINFALBUM:Album\n#EXTINFYEAR:1999\n"
