@@ -1,12 +1,15 @@
 #include <unistd.h>
 #include <vorelix/player/custom_key.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdio>
 #include <exception>
 #include <fstream>
 #include <memory>
+#include <string>
 #include <utility>
+#include <vector>
 
 #include "custom_key_internal.h"
 #include "log_internal.h"
@@ -76,6 +79,19 @@ bool areTexts(const Json::Value &element) {
     return true;
 }
 
+/* The writer cuts a name at a NUL, which can make it that of another member. The parser has bounded
+ * the depth. */
+bool areNamesWhole(const Json::Value &value) {  // NOLINT(misc-no-recursion)
+    const auto isWhole = [](const std::string &name) { return name.find('\0') == name.npos; };
+    if (value.isObject()) {
+        const std::vector<std::string> names = value.getMemberNames();
+        if (!std::all_of(names.begin(), names.end(), isWhole)) {
+            return false;
+        }
+    }
+    return std::all_of(value.begin(), value.end(), areNamesWhole);
+}
+
 /* The file of a key's function with a number that is one. */
 bool loadFor(int key, const KeyMessages &messages, Json::Value &root) {
     if (indexOf(key) >= kKeyCount) {
@@ -113,7 +129,7 @@ int setKey(int key, const std::string &type, const std::string &value, const std
     if (!loadFor(key, kSet, root)) {
         return -1;
     }
-    if (!takesKeys(root, indexOf(key))) {
+    if (!takesKeys(root, indexOf(key)) || !areNamesWhole(root)) {
         kSet.notLoaded();
         return -1;
     }

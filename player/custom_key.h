@@ -34,8 +34,9 @@ VORELIX_API int ZANOAudioCustomGet(int key, std::string &type, std::string &valu
 
 /* Changes one key, by its number from 1 to 4, and writes the whole file. Whatever else the file
  * holds stays, comments included. A file without "items" gets them, null before the changed one.
- * -1 with the file as it was: another number, or a file that cannot be read or whose JSON has
- * another shape. -1 also when it cannot be written, of which a part may be left then. */
+ * -1 with the file as it was: another number, or a file that cannot be read, whose JSON has another
+ * shape, or a name with a NUL, which could not be written. -1 also when the file cannot be written,
+ * of which a part may be left then. */
 VORELIX_API int ZANOAudioCustomSet(int key, const std::string &type, const std::string &value,
                                    const std::string &title);
 

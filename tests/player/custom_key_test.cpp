@@ -117,6 +117,7 @@ TEST_F(CustomKeys, OfAFileOfAnyShapeAreReadAndSetOrRefused) {
          R"({"items":[{},{"id":9,"more":[1],"title":"x","type":"t","value":"v"}]})", ""},
         {R"({"items":[0,{"type":5,"value":true,"title":null}]})", "5|true|", "",
          R"({"items":[0,)" + set + "]}", ""},
+        {R"({"items":[],"more":[{"items\u0000":0}]})", "||", "", "", setFails},
         {R"(/*kept*/{"items":[1,{}]})", "||", "", R"(/*kept*/{"items":[1,)" + set + "]}", ""},
     };
     for (const auto &each : cases) {
