@@ -126,6 +126,21 @@ class Questions {
             prepare(select +
                     "INDEXED BY songs_by_artist_down WHERE (artist_key, tail_rank_down)<="
                     "(?1, ?2) ORDER BY artist_key DESC, tail_rank_down DESC LIMIT 50");
+        const int artistByAnchor = prepare(
+            select +
+            "INDEXED BY songs_by_artist_down WHERE (artist_key, tail_rank_down)<=(SELECT "
+            "artist_key, tail_rank_down FROM songs WHERE id=(SELECT song FROM anchors WHERE "
+            "stored_order=6 AND place=?1)) ORDER BY artist_key DESC, tail_rank_down DESC "
+            "LIMIT 50 OFFSET ?2");
+        add(
+            "page at half depth by artist, descending/library",
+            [half] { return listed(nullptr, "lower(artist)", false, half, 50); }, 50);
+        add(
+            "page at half depth by artist, descending/raw (by anchor)",
+            [this, artistByAnchor, half] {
+                return raw_.rows(artistByAnchor, {}, {half / 128, half % 128});
+            },
+            50);
         const std::string at =
             " FROM songs INDEXED BY songs_by_artist_down ORDER BY artist_key DESC, "
             "tail_rank_down DESC LIMIT 1 OFFSET " +

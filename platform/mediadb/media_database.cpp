@@ -9,7 +9,9 @@
 #include <mutex>
 #include <optional>
 #include <tuple>
+#include <utility>
 
+#include "clock_tick.h"
 #include "engine.h"
 #include "postgresql/engine.h"
 #include "query/parse.h"
@@ -44,30 +46,42 @@ std::pair<const EngineKind *, std::string> engineOf(const std::string &location)
                             location);
 }
 
-/* The engine of the current settings. They are looked at again when their file changes, so that
- * a long-running program follows. A cursor keeps the engine it was opened on. */
+/* The engine of the current settings. Their file is looked at again in every clock tick, so that a
+ * long-running program follows a change. A cursor keeps the engine it was opened on. */
 class CurrentEngine {
   public:
     std::shared_ptr<Engine> get() {
-        struct stat file {};
-        const bool isThere = stat(ZANO_PATH_CONF, &file) == 0;
-        const Stamp stamp{isThere, file.st_ino, file.st_size, file.st_mtim.tv_sec,
-                          file.st_mtim.tv_nsec};
+        const bool isDue = tick_.isAnother();
         const std::lock_guard lock(mutex_);
-        if (!engine_ || stamp != stamp_) {
-            const std::string location = configuredLocation();
-            if (!engine_ || location != location_) {
-                const auto [kind, place] = engineOf(location);
-                engine_ = kind->make(place);
-                location_ = location;
-            }
-            stamp_ = stamp;
+        if (!engine_ || isDue) {
+            followSettings();
         }
         return engine_;
     }
 
   private:
+    void followSettings() {
+        struct stat file {};
+        const bool isThere = stat(ZANO_PATH_CONF, &file) == 0;
+        const Stamp stamp{isThere, file.st_ino, file.st_size, file.st_mtim.tv_sec,
+                          file.st_mtim.tv_nsec};
+        if (engine_ && stamp == stamp_) {
+            return;
+        }
+        // Settings that name no engine leave none, so that every call fails and looks again.
+        std::shared_ptr<Engine> former = std::exchange(engine_, nullptr);
+        const std::string location = configuredLocation();
+        if (!former || location != location_) {
+            const auto [kind, place] = engineOf(location);
+            former = kind->make(place);
+            location_ = location;
+        }
+        engine_ = std::move(former);
+        stamp_ = stamp;
+    }
+
     using Stamp = std::tuple<bool, ino_t, off_t, time_t, long>;
+    ClockTick tick_;
     std::mutex mutex_;
     std::shared_ptr<Engine> engine_;
     std::string location_;

@@ -153,28 +153,38 @@ void ReaderPool::forgetOthers() {
     }
 }
 
-ReaderPool::Lease ReaderPool::lease() {
+/* Another file under the same name: a database that was put back from a copy, say. */
+void ReaderPool::followFile() {
     struct stat file {};
     const bool isThere = stat(path_.c_str(), &file) == 0;
-    std::unique_ptr<Reader> reader;
-    {
-        const std::lock_guard lock(mutex_);
-        if (forks_ != forksSoFar()) {
-            forgetOthers();
-            idle_.clear();
-            forks_ = forksSoFar();
-        }
-        /* Another file under the same name: a database that was put back from a copy, say. */
-        if (!isThere || file.st_dev != device_ || file.st_ino != inode_) {
-            idle_.clear();
-            device_ = file.st_dev;
-            inode_ = file.st_ino;
-        }
-        if (!idle_.empty()) {
-            reader = std::move(idle_.back());
-            idle_.pop_back();
-        }
+    if (!isThere || file.st_dev != device_ || file.st_ino != inode_) {
+        idle_.clear();
+        device_ = file.st_dev;
+        inode_ = file.st_ino;
     }
+}
+
+std::unique_ptr<Reader> ReaderPool::takeIdle() {
+    const bool isDue = tick_.isAnother();
+    const std::lock_guard lock(mutex_);
+    if (forks_ != forksSoFar()) {
+        forgetOthers();
+        idle_.clear();
+        forks_ = forksSoFar();
+    }
+    if (isDue || idle_.empty()) {
+        followFile();
+    }
+    if (idle_.empty()) {
+        return nullptr;
+    }
+    auto reader = std::move(idle_.back());
+    idle_.pop_back();
+    return reader;
+}
+
+ReaderPool::Lease ReaderPool::lease() {
+    auto reader = takeIdle();
     if (!reader) {
         reader = std::make_unique<Reader>(path_);
     }

@@ -18,6 +18,7 @@
 #include <utility>
 #include <vector>
 
+#include "../clock_tick.h"
 #include "../forks.h"
 #include "../query/render.h"
 #include "handle.h"
@@ -110,9 +111,12 @@ class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
 
   private:
     void forgetOthers();
+    void followFile();
+    std::unique_ptr<Reader> takeIdle();
     void giveBack(std::unique_ptr<Reader> reader) noexcept;
 
     std::string path_;
+    ClockTick tick_;
     std::mutex mutex_;
     std::vector<std::unique_ptr<Reader>> idle_;
     unsigned forks_ = 0;

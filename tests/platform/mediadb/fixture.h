@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "mediadb/catalogue.h"
+#include "mediadb/clock_tick.h"
 #include "system_paths_internal.h"
 
 namespace zano::mediadb {
@@ -40,6 +41,14 @@ class MediaDatabaseTest : public testing::Test {
     const std::string &location() const { return location_; }
     static void setSetting(const std::string &value) {
         std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << value << "\"\n";
+        awaitTick();
+    }
+    /* The settings and the database file are looked at once in a tick of the clock. */
+    static void awaitTick() {
+        ClockTick tick;
+        tick.isAnother();
+        while (!tick.isAnother()) {
+        }
     }
 
     static Song song(const std::string &path, const std::string &title) {

@@ -286,11 +286,12 @@ TEST_F(FileTest, FilesThatAreNoMediaDatabaseAreRefusedAndLeftAlone) {
     refused(KLIB_ERR_DATABASE_VERSION, "a database of a newer version");
 
     setSetting("mysql://localhost/x");
-    EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
-    EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_CONFIGURATION);
+    for (int call = 0; call < 3; ++call) {
+        EXPECT_EQ(MediaInfoDBOpen(0, "*", nullptr, nullptr, nullptr, 0, 0, 0), nullptr);
+        EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_CONFIGURATION);
+    }
 }
 
-/* A reader whose user may not write in the folder, when the writer is long gone. */
 TEST_P(SafetyTest, ListsOfTextsHoldAnyBytes) {
     const std::vector<std::string> paths = {"/a/\"quoted\"", "/a/back\\slash\\\\", "/a/it's",
                                             "/a/tab\tand\x01", "/a/\xC3\xA9\xE3\x83\x89"};
@@ -420,6 +421,7 @@ TEST_F(FileTest, AReplacedDatabaseIsNoticed) {
     }
     auto catalogue = openCatalogue(location());
     put(*catalogue, {song("/other/x", "X")});
+    awaitTick();
     EXPECT_EQ(rows(nullptr, "path"), std::vector<std::string>{"/other/x"});
 }
 
