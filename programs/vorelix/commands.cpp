@@ -36,6 +36,13 @@ const std::vector<Command> &allCommands() {
          kFile | kTitle | kForm | kForce | kDirectory | kWait, playlistImportCommand},
         {"playlist export", "Write a playlist file for other programs or places",
          kPlaylist | kTo | kForce | kDirectory | kWait, playlistExportCommand},
+        {"users", "Say what the users may do", 0, nullptr},
+        {"users list", "List the entries of users", 0, usersListCommand},
+        {"users show", "Show what users may do", kUserNames, usersShowCommand},
+        {"users set", "Set what a user may do", kUser | kUserRights, usersSetCommand},
+        {"users remove", "Remove the entry of a user, who may stream then", kUser,
+         usersRemoveCommand},
+        {"users sync", "Remove the entries of users that are gone", 0, usersSyncCommand},
     };
     return commands;
 }

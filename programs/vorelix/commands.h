@@ -43,4 +43,15 @@ Outcome playlistDeleteCommand(const Request &request, const Terminal &terminal);
 Outcome playlistImportCommand(const Request &request, const Terminal &terminal);
 Outcome playlistExportCommand(const Request &request, const Terminal &terminal);
 
+/* What users may do. A user has "uid" and "rights", by name:
+ *   list          {"users": [with "exists"]}
+ *   show          {"users": [with "name"]}: what is in effect
+ *   set           {"user"}
+ *   remove, sync  {"removed": [uids]} */
+Outcome usersListCommand(const Request &request, const Terminal &terminal);
+Outcome usersShowCommand(const Request &request, const Terminal &terminal);
+Outcome usersSetCommand(const Request &request, const Terminal &terminal);
+Outcome usersRemoveCommand(const Request &request, const Terminal &terminal);
+Outcome usersSyncCommand(const Request &request, const Terminal &terminal);
+
 }  // namespace vorelix

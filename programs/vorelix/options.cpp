@@ -8,6 +8,7 @@
 #include "option_checks.h"
 #include "playlist_options.h"
 #include "text.h"
+#include "users_options.h"
 
 namespace vorelix {
 
@@ -161,6 +162,7 @@ struct Parser {
             addOrder(sub, command.arguments, request);
             addPaging(sub, command.arguments, request, paging);
             addPlaylistArguments(sub, command.arguments, request.playlist);
+            addUsersArguments(sub, command.arguments, request.users);
             sub.footer("Also --json and --verbose: see vorelix --help");
             sub.callback([this, &command] { request.command = &command; });
         }

@@ -43,6 +43,10 @@ enum Arguments : unsigned {
     kForce = 1U << 21,      // --force
     kDirectory = 1U << 22,  // --dir
     kWait = 1U << 23,       // --wait
+    // of users
+    kUser = 1U << 29,        // USER
+    kUserNames = 1U << 30,   // USER...
+    kUserRights = 1U << 31,  // RIGHT...
 };
 
 struct Command {
@@ -66,6 +70,13 @@ struct PlaylistRequest {
     int waitSeconds = 10;
 };
 
+/* What users commands were given. */
+struct UsersRequest {
+    std::string user;  // a name or a number
+    std::vector<std::string> names;
+    std::vector<std::string> rights;
+};
+
 struct Request {
     const Command *command = nullptr;
     std::vector<std::string> words;  // the whole command line as it was typed
@@ -78,6 +89,7 @@ struct Request {
     std::string column;
     std::vector<int> ids;
     PlaylistRequest playlist;
+    UsersRequest users;
 };
 
 }  // namespace vorelix

@@ -7,14 +7,9 @@
 #include <iterator>
 
 #include "failure.h"
+#include "rights.h"
 
 namespace webapi {
-
-const Right kRights[kRightCount] = {
-    {"usb", AudioUsers::kUsb},           {"streaming", AudioUsers::kStreaming},
-    {"playlist", AudioUsers::kPlaylist}, {"upnp", AudioUsers::kUpnp},
-    {"editsong", AudioUsers::kEditSong},
-};
 
 namespace {
 
@@ -91,8 +86,8 @@ bool isFromThisSite(const Request &request) {
 }
 
 const char *nameOf(unsigned right) {
-    return std::find_if(std::begin(kRights), std::end(kRights),
-                        [right](const Right &row) { return row.bit == right; })
+    return std::find_if(std::begin(vorelix::kRights), std::end(vorelix::kRights),
+                        [right](const vorelix::Right &row) { return row.bit == right; })
         ->name;
 }
 

@@ -26,14 +26,6 @@ struct ActionKind {
     std::unique_ptr<ActionHandler> (*make)(const ActionKind &kind, const Request &request);
 };
 
-/* Rights by the names that the answers have for them. */
-struct Right {
-    const char *name;
-    unsigned bit;
-};
-inline constexpr std::size_t kRightCount = 5;
-extern const Right kRights[kRightCount];
-
 /* Lines of a header that come before the library's. Nothing for a status below 300 is needed. */
 void writeStatus(int status, const std::string &headers);
 

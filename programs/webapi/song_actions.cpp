@@ -3,6 +3,7 @@
 #include <vorelix/users/audiousers.h>
 
 #include "music_folder.h"
+#include "rights.h"
 #include "song_answers.h"
 #include "songs.h"
 #include "span.h"
@@ -46,7 +47,7 @@ Json::Value RightsAction::answer() {
     Json::Value answer;
     answer["user"] = request().user;
     answer["mask"] = mask;
-    for (const Right &right : kRights) {
+    for (const vorelix::Right &right : vorelix::kRights) {
         answer[right.name] = (mask & right.bit) != 0;
     }
     return answer;
