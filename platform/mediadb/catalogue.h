@@ -36,11 +36,9 @@ struct FileStamp {
     bool operator==(const FileStamp &) const = default;
 };
 
-/* A song as it is stored. Texts are valid UTF-8 without NUL, but for the path, which is the
- * bytes that open the file. Numbers are 0 where unknown. */
-struct Song {
-    std::string path;
-    FileStamp stamp;
+/* What the tags of a file say. Texts are valid UTF-8 without NUL, empty where the file has none;
+ * numbers are 0 where unknown and never negative. */
+struct Tags {
     std::string title;
     std::string album;
     std::string artist;
@@ -52,6 +50,12 @@ struct Song {
     double duration = 0;  // seconds
     int bitrate = 0;      // bits per second
     int frequency = 0;    // hertz
+};
+
+/* A song as it is stored. */
+struct Song : Tags {
+    std::string path;  // the bytes that open the file
+    FileStamp stamp;
 };
 
 /* A notice left by KLIBZanoFileIndexAdd. */

@@ -22,17 +22,10 @@ mediadb::Song songOf(const ListedFile &file, Tags &&tags) {
     mediadb::Song song;
     song.path = file.path;
     song.stamp = file.stamp;
-    song.title = tags.title.empty() ? titleOfPath(file.path) : std::move(tags.title);
-    song.album = std::move(tags.album);
-    song.artist = std::move(tags.artist);
-    song.albumArtist = std::move(tags.albumArtist);
-    song.genre = std::move(tags.genre);
-    song.year = tags.year;
-    song.track = tags.track;
-    song.disc = tags.disc;
-    song.duration = tags.duration;
-    song.bitrate = tags.bitrate;
-    song.frequency = tags.frequency;
+    song.Tags::operator=(std::move(tags));
+    if (song.title.empty()) {
+        song.title = titleOfPath(file.path);
+    }
     return song;
 }
 

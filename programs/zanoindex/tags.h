@@ -5,23 +5,12 @@
 #include <string>
 #include <string_view>
 
+#include "mediadb/catalogue.h"
+
 namespace zano::index {
 
-/* Texts are storable (text.h) and empty where the file has none; numbers are 0 where unknown and
- * never negative. */
-struct Tags {
-    std::string title;
-    std::string album;
-    std::string artist;
-    std::string albumArtist;
-    std::string genre;
-    int year = 0;
-    int track = 0;
-    int disc = 0;
-    double duration = 0;  // seconds
-    int bitrate = 0;      // bits per second
-    int frequency = 0;    // hertz
-};
+/* Texts are storable (text.h). */
+using mediadb::Tags;
 
 enum class ReadStatus : std::uint8_t {
     kRead,
