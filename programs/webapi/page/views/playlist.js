@@ -197,7 +197,7 @@ export class Playlist extends View {
 
     async #delete() {
         if (await deletePlaylist(this.app, this.#query.id, this.title)) {
-            this.app.go('playlists', {}, { replace: true });
+            await this.app.go('playlists', {}, { replace: true });
             this.app.notices.say(`Playlist “${this.title}” deleted`);
         }
     }
