@@ -2,6 +2,7 @@
 
 #include <json/writer.h>
 
+#include "song_json.h"
 #include "text.h"
 
 namespace vorelix {
@@ -16,15 +17,7 @@ std::string documentOf(const Json::Value &value) {
 }
 
 Json::Value songObject(const ZANO_MEDIA_INFO &song) {
-    Json::Value object(Json::objectValue);
-    object["id"] = song.id;
-    object["title"] = validUtf8(song.title);
-    object["artist"] = validUtf8(song.artist);
-    object["album"] = validUtf8(song.album);
-    object["genre"] = validUtf8(song.genre);
-    object["year"] = song.year;
-    object["track"] = song.track;
-    object["disc"] = song.disc;
+    Json::Value object = tagsObject(song);
     object["duration"] = song.duration;
     object["bitrate"] = song.bitrate;
     object["frequency"] = song.frequency;
@@ -37,11 +30,7 @@ Json::Value songObject(const ZANO_MEDIA_INFO &song) {
 }
 
 Json::Value songArray(const ZANO_PLAYLIST_REC *list) {
-    Json::Value array(Json::arrayValue);
-    for (; list != nullptr; list = list->next) {
-        array.append(songObject(list->info));
-    }
-    return array;
+    return songArrayOf(list, songObject);
 }
 
 Json::Value withSpan(Json::Value answer, const Span &span, int total) {

@@ -7,6 +7,8 @@
 #include <new>
 #include <string_view>
 
+#include "song_json.h"
+
 namespace webapi {
 
 namespace {
@@ -22,15 +24,7 @@ double seconds(float duration) {
 }
 
 Json::Value tagsOf(const ZANO_MEDIA_INFO &info) {
-    Json::Value object(Json::objectValue);
-    object["id"] = info.id;
-    object["title"] = info.title;
-    object["artist"] = info.artist;
-    object["album"] = info.album;
-    object["genre"] = info.genre;
-    object["year"] = info.year;
-    object["track"] = info.track;
-    object["disc"] = info.disc;
+    Json::Value object = vorelix::tagsObject(info);
     object["duration"] = seconds(info.duration);
     return object;
 }
@@ -55,11 +49,7 @@ Json::Value entryObject(const ZANO_MEDIA_INFO &entry) {
 }
 
 Json::Value songArray(const ZANO_PLAYLIST_REC *list) {
-    Json::Value array(Json::arrayValue);
-    for (; list != nullptr; list = list->next) {
-        array.append(songObject(list->info));
-    }
-    return array;
+    return vorelix::songArrayOf(list, songObject);
 }
 
 std::string streamIdOf(int song) {
