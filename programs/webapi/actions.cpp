@@ -5,6 +5,7 @@
 #include <iterator>
 
 #include "file_actions.h"
+#include "key_actions.h"
 #include "playlist_actions.h"
 #include "song_actions.h"
 
@@ -26,6 +27,7 @@ std::unique_ptr<ActionHandler> make(const ActionKind &kind, const Request &reque
 }
 
 constexpr unsigned kStreaming = AudioUsers::kStreaming;
+constexpr unsigned kUsb = AudioUsers::kUsb;
 constexpr unsigned kPlaylist = AudioUsers::kPlaylist;
 
 constexpr ActionKind kActions[] = {
@@ -42,6 +44,8 @@ constexpr ActionKind kActions[] = {
     {"playlist-remove", kChange, kPlaylist, make<PlaylistRemoveAction>},
     {"playlist-move", kChange, kPlaylist, make<PlaylistMoveAction>},
     {"playlist-delete", kChange, kPlaylist, make<PlaylistDeleteAction>},
+    {"keys", kRead, kUsb, make<KeysAction>},
+    {"key-set", kChange, kUsb, make<KeySetAction>},
 };
 
 constexpr ActionKind kUnknown = {"request", kAnyMethod, 0, make<UnknownAction>};

@@ -59,6 +59,8 @@ Json::Value SongsAction::answer() {
     const auto listing = vorelix::listSongs(filter, order, spanOf(parameters()));
     Json::Value answer;
     answer["songs"] = songArray(listing.songs.get());
+    // Of this very query. ZANOPageTotalRowCount counts other songs for an exact artist, and for a
+    // keyword with a % in it, and would count a second time what ZANOMusicBrowse has counted.
     answer["total"] = listing.total;
     return answer;
 }

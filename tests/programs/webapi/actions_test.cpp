@@ -112,6 +112,25 @@ TEST_F(Front, PlaylistsAreMadeEditedAndDeleted) {
     EXPECT_EQ(ask({.query = "action=playlist&id=1"}).outcome(), "404 id");
 }
 
+TEST_F(Front, KeysAreShownAndSet) {
+    serveDevice();
+    std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CUSTOM_KEYS).parent_path());
+    std::filesystem::remove(ZANO_PATH_CUSTOM_KEYS);
+    post("action=key-set", "key=4&type=web+radio&value=http://x.example/y&title=%C3%89t%C3%A9");
+    post("action=key-set", "key=1&type=&value=v&title=");
+    EXPECT_EQ(textOf(get("action=keys")["keys"]),
+              R"([{"key":1,"title":"","type":"","value":"v"},)"
+              R"({"key":2,"title":"","type":"","value":""},)"
+              R"({"key":3,"title":"","type":"","value":""},)"
+              R"({"key":4,"title":"Été","type":"web radio","value":"http://x.example/y"}])");
+    files::write(ZANO_PATH_CUSTOM_KEYS, "{");
+    EXPECT_EQ(ask({.query = "action=keys"}).outcome(), "500 keys");
+    EXPECT_EQ(ask({.query = "action=key-set", .form = "key=1&type=&value=&title="}).outcome(),
+              "500 keys");
+    EXPECT_EQ(files::read(ZANO_PATH_CUSTOM_KEYS), "{");
+    std::filesystem::remove(ZANO_PATH_CUSTOM_KEYS);
+}
+
 /* A form that is only read, a file that is gone, and one that leads out of the folder. */
 TEST_F(Front, PlaylistsThatCannotBeEdited) {
     serveDevice();

@@ -54,7 +54,8 @@ std::vector<Values> badValues() {
          {"playlist-move", "from", "id=1&to=1&total=3", true},
          {"playlist-move", "to", "id=1&from=0&total=3", true},
          {"playlist-move", "total", "id=1&from=0&to=1", true},
-         {"playlist-delete", "id", "", true}},
+         {"playlist-delete", "id", "", true},
+         {"key-set", "key", "type=a&value=b&title=c", true}},
         {"", "x", "-1", "+1", "1x", "%201", "0x1", "2147483648", "99999999999999999999",
          "1%20or%201=1", "1%FF", "1%00", times(2000, "9")}};
     const Values lists = {{{"playlist-append", "songs", "id=1", true},
@@ -73,13 +74,18 @@ std::vector<Values> badValues() {
                            {"songs", "album", "", false},
                            {"songs", "genre", "", false}},
                           {"%FF", "%ED%A0%80", "a%00b", times(1025, "a")}};
+    const Values keys = {{{"key-set", "key", "type=a&value=b&title=c", true}}, {"0", "5", "1,2"}};
+    const Values keyTexts = {{{"key-set", "type", "key=1&value=b&title=c", true},
+                              {"key-set", "value", "key=1&type=b&title=c", true},
+                              {"key-set", "title", "key=1&type=b&value=c", true}},
+                             {"%FF", "a%00b", times(1025, "a")}};
     const Values titles = {{{"playlist-create", "title", "", true}},
                            {"", ".hidden", "a/b", "..%2F..%2Fx", "%0A", "%1B[2J", "a%00b", "%FF",
                             times(252, "a"), times(1000000, "a")}};
     const Values streams = {
         {{"stream", "song", "", false}, {"mimetype", "extension", "", false}},
         {"", "%22", "../x", "a.b", times(1025, "a"), "%FF", "x%00", "12345/", "zzzzzz."}};
-    return {numbers, lists, choices, texts, titles, streams};
+    return {numbers, lists, choices, texts, keys, keyTexts, titles, streams};
 }
 
 class Hostile : public Front {
@@ -162,6 +168,9 @@ TEST_F(Hostile, WhatIsMissingOrNotThere) {
         {{.query = "action=playlist-move", .form = "id=1&total=3&from=0&to=3"}, "400 to"},
         {{.query = "action=playlist-move", .form = "id=1&total=4&from=0&to=3"}, "409 total"},
         {{.query = "action=playlist-delete", .form = "id=2"}, "404 id"},
+        {{.query = "action=key-set", .form = "key=1&value=a&title=b"}, "400 type"},
+        {{.query = "action=key-set", .form = "key=1&type=a&title=b"}, "400 value"},
+        {{.query = "action=key-set", .form = "key=1&type=a&value=b"}, "400 title"},
         {{.query = "action=playlist-delete",
           .form = "x",
           .headers = "Content-Type: text/plain\r\n"},
@@ -261,7 +270,8 @@ TEST_F(Hostile, NoActionWithoutItsRight) {
         {"playlists", "", 4},        {"playlist", "", 4},
         {"playlist-create", "x", 4}, {"playlist-append", "x", 4},
         {"playlist-remove", "x", 4}, {"playlist-move", "x", 4},
-        {"playlist-delete", "x", 4},
+        {"playlist-delete", "x", 4}, {"keys", "", 1},
+        {"key-set", "x", 1},
     };
     for (const User *user : {&kAdmin, &kStreamer, &kLister, &kNobody}) {
         const Json::Value rights = ask({.query = "action=rights", .user = user}).json();
@@ -274,7 +284,8 @@ TEST_F(Hostile, NoActionWithoutItsRight) {
                 ask({.query = std::string("action=") + row.action, .form = row.form, .user = user})
                     .outcome();
             const bool isAllowed = (user->rights & row.right) == row.right;
-            const std::string refused = row.right == 2 ? "403 streaming" : "403 playlist";
+            const char *const names[] = {"", "403 usb", "403 streaming", "", "403 playlist"};
+            const std::string refused = names[row.right];
             EXPECT_EQ(outcome == refused, !isAllowed)
                 << user->name << " " << row.action << ": " << outcome;
             EXPECT_EQ(outcome.substr(0, 3) == "403", !isAllowed) << outcome;
