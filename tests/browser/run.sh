@@ -12,7 +12,7 @@ fail() {
     exit 1
 }
 for program in chromium node npm lighttpd ffmpeg; do
-    command -v "$program" >/dev/null || fail "$program is missing; scripts/dependencies browser installs it"
+    command -v "$program" >/dev/null || fail "$program is missing; scripts/dependencies test installs it"
 done
 mkdir -p "$WORK/npm" "$ROOT/var/services" "$ROOT/usr/zano/etc" "$ROOT/usr/zano/bin" "$ROOT/tmp"
 
