@@ -58,6 +58,13 @@ struct Song : Tags {
     FileStamp stamp;
 };
 
+/* A playlist file. path: the bytes that open it; texts are valid UTF-8 without NUL. */
+struct PlaylistFile {
+    std::string path;
+    std::string title;
+    std::string folder;  // the name of the folder that it lies in: the column "album"
+};
+
 /* A notice left by KLIBZanoFileIndexAdd. */
 struct Notice {
     std::int64_t id = 0;
@@ -87,6 +94,11 @@ class Catalogue {
     /* true when there was a row of that path. */
     virtual bool removeSong(const std::string &path) = 0;
     virtual bool removePlaylist(const std::string &path) = 0;
+    /* Within a batch. A row of the same path stays as it is: who edits playlists names them. */
+    virtual void addPlaylist(const PlaylistFile &playlist) = 0;
+
+    /* The paths of the playlists at or below a folder, as for forEachFile(), in byte order. */
+    virtual std::vector<std::string> playlists(const std::string &folder) = 0;
 
     /* Ends a scan, outside of a batch: brings the order and search indexes up to date with all
      * songs and refreshes the planner's statistics. Cheap when nothing changed. A first scan

@@ -153,8 +153,8 @@ void FolderWalker::readEntries(int descriptor) {
 /* false, with errno set, when nothing can be learned of the entries of this folder. */
 bool FolderWalker::addEntry(Level &level, int descriptor, std::string_view name,
                             unsigned char type) {
-    const bool isAudio = formatOfName(name) != Format::kNone;
-    const bool canMatter = type == DT_LNK || type == DT_UNKNOWN || (type == DT_REG && isAudio);
+    const bool isWanted = formatOfName(name) != Format::kNone || isPlaylistName(name);
+    const bool canMatter = type == DT_LNK || type == DT_UNKNOWN || (type == DT_REG && isWanted);
     if (type == DT_DIR) {
         add(level, std::string(name) + '/', {});
     }
@@ -170,7 +170,7 @@ bool FolderWalker::addEntry(Level &level, int descriptor, std::string_view name,
         addTarget(level, name, status, isLink);
     } else if (errno == EACCES && !isLink) {
         return false;
-    } else if (!isAbsence(errno) && isAudio) {
+    } else if (!isAbsence(errno) && isWanted) {
         fail(path_ + std::string(name), errno);
     }
     return true;
@@ -188,6 +188,12 @@ bool FolderWalker::addTarget(Level &level, std::string_view name, const struct s
         add(level, std::string(name) + '/', {});
         return true;
     }
+    if (S_ISREG(status.st_mode) && isPlaylistName(name)) {
+        if (isWithinBounds(path_.size(), name)) {
+            playlists_.push_back(path_ + std::string(name));
+        }
+        return true;
+    }
     if (!S_ISREG(status.st_mode) || formatOfName(name) == Format::kNone) {
         return false;
     }
@@ -196,12 +202,19 @@ bool FolderWalker::addTarget(Level &level, std::string_view name, const struct s
 }
 
 void FolderWalker::add(Level &level, std::string_view name, const mediadb::FileStamp &stamp) {
-    if (level.pathSize + name.size() > kMaxPathBytes) {
-        fail(path_ + std::string(name), ENAMETOOLONG);
+    if (!isWithinBounds(level.pathSize, name)) {
         return;
     }
     level.entries.push_back({level.names.size(), name.size(), stamp});
     level.names.append(name);
+}
+
+bool FolderWalker::isWithinBounds(std::size_t pathSize, std::string_view name) {
+    const bool isWithin = pathSize + name.size() <= kMaxPathBytes;
+    if (!isWithin) {
+        fail(path_ + std::string(name), ENAMETOOLONG);
+    }
+    return isWithin;
 }
 
 void FolderWalker::fail(std::string path, int error) {

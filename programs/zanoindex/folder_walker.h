@@ -1,4 +1,4 @@
-/* The audio files below a folder, in byte order of their paths.
+/* The audio files below a folder, in byte order of their paths, and its playlists.
  *
  * Names that begin with a dot are left out, as is what they hold. Links to files are followed;
  * links to folders are not (so there is no loop and no song twice) but counted. Paths are bytes;
@@ -43,6 +43,9 @@ class FolderWalker {
     /* Whether start was there when it was looked at. */
     bool hasStart() const { return hasStart_; }
 
+    /* The playlist files met up to now, in no order. */
+    const std::vector<std::string> &playlists() const { return playlists_; }
+
     /* What could not be looked at up to now. */
     const std::vector<WalkFailure> &failures() const { return failures_; }
     /* true for a path at or below a failure: whether it exists is not known. */
@@ -76,6 +79,7 @@ class FolderWalker {
     bool addEntry(Level &level, int descriptor, std::string_view name, unsigned char type);
     bool addTarget(Level &level, std::string_view name, const struct stat &status, bool isLink);
     void add(Level &level, std::string_view name, const mediadb::FileStamp &stamp);
+    bool isWithinBounds(std::size_t pathSize, std::string_view name);
     void fail(std::string path, int error);
     Level &pushLevel();
 
@@ -85,6 +89,7 @@ class FolderWalker {
     bool hasStart_ = false;
     std::vector<Level> levels_;  // those beyond depth_ wait to be used again
     std::size_t depth_ = 0;
+    std::vector<std::string> playlists_;
     std::vector<WalkFailure> failures_;
     std::unordered_set<std::string> failed_;
     std::size_t skippedLinks_ = 0;

@@ -55,18 +55,29 @@ constexpr auto sortedRows() {
 
 constexpr auto kRows = sortedRows();
 
+constexpr std::array kPlaylistSuffixes = {packed("m3u"), packed("m3u8"), packed("pls"),
+                                          packed("wpl")};
+
+/* 0: none. A dot in front hides a file; it begins no suffix. */
+std::uint32_t suffixOf(std::string_view name) {
+    const auto dot = name.rfind('.');
+    const bool isNone =
+        dot == std::string_view::npos || dot == 0 || name.size() - dot - 1 > kLongestSuffix;
+    return isNone ? 0 : packed(name.substr(dot + 1));
+}
+
 }  // namespace
 
 Format formatOfName(std::string_view name) {
-    const auto dot = name.rfind('.');
-    // A dot in front hides a file; it begins no suffix.
-    if (dot == std::string_view::npos || dot == 0 || name.size() - dot - 1 > kLongestSuffix) {
-        return Format::kNone;
-    }
-    const auto suffix = packed(name.substr(dot + 1));
+    const std::uint32_t suffix = suffixOf(name);
     const auto *row = std::lower_bound(kRows.begin(), kRows.end(), suffix,
                                        [](const Row &a, std::uint32_t b) { return a.suffix < b; });
     return row != kRows.end() && row->suffix == suffix ? row->format : Format::kNone;
+}
+
+bool isPlaylistName(std::string_view name) {
+    return std::find(kPlaylistSuffixes.begin(), kPlaylistSuffixes.end(), suffixOf(name)) !=
+           kPlaylistSuffixes.end();
 }
 
 }  // namespace zano::index

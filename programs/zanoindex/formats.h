@@ -1,4 +1,4 @@
-/* The kinds of audio file, told by the suffix of the name. */
+/* The kinds of audio file, and playlists, told by the suffix of the name. */
 #pragma once
 
 #include <cstdint>
@@ -26,5 +26,8 @@ enum class Format : std::uint8_t {
 /* The format by the text behind the last dot of a file name, in any case; kNone for names that
  * are not indexed. */
 Format formatOfName(std::string_view name);
+
+/* Whether it is the name of a playlist: m3u, m3u8, pls or wpl in any case. */
+bool isPlaylistName(std::string_view name);
 
 }  // namespace zano::index

@@ -7,6 +7,8 @@
 #include <filesystem>
 #include <utility>
 
+#include "text.h"
+
 namespace zano::index {
 namespace {
 
@@ -22,6 +24,10 @@ std::string normalised(const std::string &folder) {
         path.pop_back();
     }
     return path;
+}
+
+void append(std::vector<std::string> &all, const std::vector<std::string> &more) {
+    all.insert(all.end(), more.begin(), more.end());
 }
 
 bool isBelow(const std::string &path, const std::string &folder) {
@@ -79,7 +85,10 @@ void Indexer::refresh(const std::vector<std::string> &paths) {
     const Stopwatch stopwatch(session_);
     Plan plan;
     for (const auto &path : paths) {
-        plan.vanished.push_back(planner_.compare(path, plan.toRead).vanished);
+        auto comparison = planner_.compare(path, plan.toRead);
+        plan.vanished.push_back(std::move(comparison.vanished));
+        append(plan.newPlaylists, comparison.newPlaylists);
+        append(plan.vanishedPlaylists, comparison.vanishedPlaylists);
     }
     carryOut(plan);
 }
@@ -89,10 +98,15 @@ void Indexer::planFolder(const std::string &folder, Plan &plan) {
     if (session_.stop.isMade()) {
         return;
     }
+    append(plan.newPlaylists, comparison.newPlaylists);
+    const bool isEmpty = comparison.found == 0 && !comparison.hasPlaylists;
     if (mustKeep(folder, comparison)) {
         session_.summary.kept += static_cast<std::int64_t>(comparison.vanished.size());
     } else {
         plan.vanished.push_back(std::move(comparison.vanished));
+        if (!isEmpty || options_.prune) {
+            append(plan.vanishedPlaylists, comparison.vanishedPlaylists);
+        }
     }
 }
 
@@ -102,8 +116,8 @@ bool Indexer::mustKeep(const std::string &folder, const Comparison &comparison) 
     if (!comparison.hasStart && comparison.known == 0) {
         struct stat status = {};
         const bool exists = lstat(folder.c_str(), &status) == 0;
-        session_.folderFailed(folder,
-                              exists ? "neither a folder nor an audio file" : std::strerror(errno));
+        session_.folderFailed(folder, exists ? "neither a folder nor a file of audio or a playlist"
+                                             : std::strerror(errno));
         return false;
     }
     if (options_.prune || gone * 2 <= comparison.known) {
@@ -130,6 +144,7 @@ void Indexer::carryOut(const Plan &plan) {
     for (const auto &vanished : plan.vanished) {
         remove(vanished);
     }
+    updatePlaylists(plan);
     if (!plan.toRead.isEmpty()) {
         TagPhase(session_, plan.toRead, options_.reading).run();
     }
@@ -148,6 +163,25 @@ void Indexer::remove(const PathList &vanished) {
         batch.commit();
         session_.summary.removed += removed;
     }
+}
+
+/* A playlist is named by its file; its entries are read when it is asked for. */
+void Indexer::updatePlaylists(const Plan &plan) {
+    if (session_.stop.isMade() || (plan.newPlaylists.empty() && plan.vanishedPlaylists.empty())) {
+        return;
+    }
+    Batch batch(session_.catalogue);
+    for (const auto &path : plan.newPlaylists) {
+        const auto folder = std::string_view(path).substr(0, path.rfind('/'));
+        session_.catalogue.addPlaylist(
+            {path, titleOfPath(path), storableText(folder.substr(folder.rfind('/') + 1))});
+    }
+    for (const auto &path : plan.vanishedPlaylists) {
+        session_.catalogue.removePlaylist(path);
+    }
+    batch.commit();
+    session_.summary.playlistsAdded += static_cast<std::int64_t>(plan.newPlaylists.size());
+    session_.summary.playlistsRemoved += static_cast<std::int64_t>(plan.vanishedPlaylists.size());
 }
 
 /* Also after a scan that found nothing new: an earlier one may have been killed before this. */

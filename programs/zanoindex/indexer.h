@@ -41,12 +41,15 @@ class Indexer {
     struct Plan {
         PathList toRead;
         std::vector<PathList> vanished;
+        std::vector<std::string> newPlaylists;
+        std::vector<std::string> vanishedPlaylists;
     };
 
     void planFolder(const std::string &folder, Plan &plan);
     bool mustKeep(const std::string &folder, const Comparison &comparison);
     void carryOut(const Plan &plan);
     void remove(const PathList &vanished);
+    void updatePlaylists(const Plan &plan);
     void finish();
 
     Session &session_;

@@ -1,6 +1,8 @@
 #include "planner.h"
 
+#include <algorithm>
 #include <cstring>
+#include <iterator>
 #include <utility>
 
 #include "text.h"
@@ -97,8 +99,24 @@ Comparison Planner::compare(const std::string &start, PathList &toRead) {
                                        merge.takeRow(path, known);
                                    });
     auto comparison = merge.takeRest();
+    comparePlaylists(start, walker, comparison);
     reportProblems(walker);
     return comparison;
+}
+
+void Planner::comparePlaylists(const std::string &start, const FolderWalker &walker,
+                               Comparison &comparison) {
+    std::vector<std::string> found = walker.playlists();
+    std::sort(found.begin(), found.end());
+    const std::vector<std::string> known = session_.catalogue.playlists(start);
+    std::vector<std::string> gone;
+    std::set_difference(found.begin(), found.end(), known.begin(), known.end(),
+                        std::back_inserter(comparison.newPlaylists));
+    std::set_difference(known.begin(), known.end(), found.begin(), found.end(),
+                        std::back_inserter(gone));
+    std::copy_if(gone.begin(), gone.end(), std::back_inserter(comparison.vanishedPlaylists),
+                 [&walker](const std::string &path) { return !walker.isUncertain(path); });
+    comparison.hasPlaylists = !found.empty();
 }
 
 void Planner::reportProblems(const FolderWalker &walker) {

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <string>
+#include <vector>
 
 #include "folder_walker.h"
 #include "mediadb/catalogue.h"
@@ -22,6 +23,9 @@ struct Comparison {
     std::int64_t found = 0;  // files on the disk
     std::int64_t known = 0;  // rows of the catalogue
     PathList vanished;       // the rows without a file
+    bool hasPlaylists = false;
+    std::vector<std::string> newPlaylists;       // without a row
+    std::vector<std::string> vanishedPlaylists;  // rows without a file
 };
 
 class Planner {
@@ -42,6 +46,8 @@ class Planner {
   private:
     class Merge;
 
+    void comparePlaylists(const std::string &start, const FolderWalker &walker,
+                          Comparison &comparison);
     void reportProblems(const FolderWalker &walker);
 
     Session &session_;

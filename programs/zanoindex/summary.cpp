@@ -11,14 +11,19 @@ namespace {
 
 struct CountRow {
     const char *name;
+    const char *text;  // for people
     std::int64_t Summary::*count;
     bool isAlwaysShown;
 };
 
 constexpr std::array kCounts = {
-    CountRow{"added", &Summary::added, true},         CountRow{"updated", &Summary::updated, true},
-    CountRow{"unchanged", &Summary::unchanged, true}, CountRow{"removed", &Summary::removed, true},
-    CountRow{"kept", &Summary::kept, false},
+    CountRow{"added", "added", &Summary::added, true},
+    CountRow{"updated", "updated", &Summary::updated, true},
+    CountRow{"unchanged", "unchanged", &Summary::unchanged, true},
+    CountRow{"removed", "removed", &Summary::removed, true},
+    CountRow{"kept", "kept", &Summary::kept, false},
+    CountRow{"playlistsAdded", "playlists added", &Summary::playlistsAdded, false},
+    CountRow{"playlistsRemoved", "playlists removed", &Summary::playlistsRemoved, false},
 };
 
 std::string percentEncoded(const std::string &bytes) {
@@ -71,7 +76,7 @@ std::string summaryText(const Summary &summary) {
     const char *separator = ": ";
     for (const auto &row : kCounts) {
         if (row.isAlwaysShown || summary.*row.count > 0) {
-            text += separator + std::to_string(summary.*row.count) + " " + row.name;
+            text += separator + std::to_string(summary.*row.count) + " " + row.text;
             separator = ", ";
         }
     }

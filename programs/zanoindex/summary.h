@@ -22,6 +22,8 @@ struct Summary {
     std::int64_t unchanged = 0;
     std::int64_t removed = 0;  // rows of files that are gone
     std::int64_t kept = 0;     // rows whose file was not found, and that stay nevertheless
+    std::int64_t playlistsAdded = 0;
+    std::int64_t playlistsRemoved = 0;
     std::vector<Problem> failed;
     std::vector<mediadb::Notice> notices;  // those that were consumed
     std::vector<Problem> folders;  // those that were not looked at in whole, or lost too much

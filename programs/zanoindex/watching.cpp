@@ -56,8 +56,10 @@ FolderChanges nextChanges(FolderWatch &watch, const StopRequest &stop) {
 }
 
 bool hasNews(const Summary &summary) {
-    return summary.added + summary.updated + summary.removed > 0 || !summary.failed.empty() ||
-           !summary.folders.empty();
+    return summary.added + summary.updated + summary.removed + summary.playlistsAdded +
+                   summary.playlistsRemoved >
+               0 ||
+           !summary.failed.empty() || !summary.folders.empty();
 }
 
 }  // namespace

@@ -125,6 +125,32 @@ class PostgresqlCatalogue : public Catalogue {
         return connection_.run(sql.bind(path).add(" RETURNING id")).size() > 0;
     }
 
+    void addPlaylist(const PlaylistFile &playlist) override {
+        Sql sql = newSql(
+            "INSERT INTO playlists(path, title, album, title_key, album_key, path_key) VALUES(");
+        std::string_view separator;
+        for (const std::string &value :
+             {playlist.path, playlist.title, playlist.folder, foldedKey(playlist.title),
+              foldedKey(playlist.folder), foldedKey(playlist.path)}) {
+            sql.add(separator).bind(value);
+            separator = ",";
+        }
+        connection_.run(sql.add(") ON CONFLICT(path) DO NOTHING"));
+    }
+
+    std::vector<std::string> playlists(const std::string &folder) override {
+        Sql sql = newSql("SELECT path FROM playlists WHERE path=");
+        sql.bind(folder).add(" OR (path>=").bind(folder + "/");
+        sql.add(" AND path<").bind(folder + "0").add(") ORDER BY path");
+        const Result rows = connection_.run(sql);
+        std::vector<std::string> paths;
+        paths.reserve(static_cast<size_t>(rows.size()));
+        for (int i = 0; i < rows.size(); ++i) {
+            paths.emplace_back(rows[i].text(0));
+        }
+        return paths;
+    }
+
     void finish(const Progress &progress) override {
         if (state("anchored") == state("generation")) {
             return;

@@ -203,6 +203,34 @@ class SqliteCatalogue : public Catalogue {
         return connection_.changes() > 0;
     }
 
+    void addPlaylist(const PlaylistFile &playlist) override {
+        const std::string titleKey = foldedKey(playlist.title);
+        const std::string folderKey = foldedKey(playlist.folder);
+        prepare(
+            "INSERT INTO playlists(path, title, album, title_key, album_key) "
+            "VALUES(?1, ?2, ?3, ?4, ?5) ON CONFLICT(path) DO NOTHING")
+            .bind(1, playlist.path)
+            .bind(2, playlist.title)
+            .bind(3, playlist.folder)
+            .bind(4, titleKey)
+            .bind(5, folderKey)
+            .run();
+    }
+
+    std::vector<std::string> playlists(const std::string &folder) override {
+        Statement rows = prepare(
+            "SELECT path FROM playlists WHERE path=?1 OR (path>=?2 AND path<?3) "
+            "ORDER BY path");
+        const std::string start = folder + "/";
+        const std::string end = folder + "0";
+        rows.bind(1, folder).bind(2, start).bind(3, end);
+        std::vector<std::string> paths;
+        while (rows.step()) {
+            paths.emplace_back(rows.text(0));
+        }
+        return paths;
+    }
+
     void finish(const Progress &progress) override {
         if (state("ordered") != 0 && state("anchored") == state("generation")) {
             return;

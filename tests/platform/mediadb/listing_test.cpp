@@ -439,6 +439,21 @@ TEST_P(ListingTest, PlaylistsAreSavedFoundChangedAndDeleted) {
     EXPECT_EQ(MediaInfoDBDelete(3, "/music/c.m3u"), 0);
     EXPECT_EQ(titles(nullptr), "2renamed;");
     EXPECT_EQ(MediaInfoDBGetCount(3, "*", nullptr, 0, 0), 1);
+
+    auto catalogue = openCatalogue(location());
+    catalogue->begin();
+    catalogue->addPlaylist({"/music/b.m3u", "of a scan", "music"});
+    catalogue->addPlaylist({"/music/\xFF.pls", "\u00C9t\u00E9", "PlayLists"});
+    catalogue->addPlaylist({"/music-2/x.wpl", "x", "music-2"});
+    catalogue->commit();
+    EXPECT_EQ(MediaInfoDBGetCount(
+                  3, "*", "album ilike 'playlists' and lower(title) = '\u00E9t\u00E9'", 0, 0),
+              1);
+    EXPECT_EQ(titles("path like '/music/b%'"), "2renamed;") << "a row stays as it is";
+    EXPECT_EQ(catalogue->playlists("/music"),
+              (std::vector<std::string>{"/music/b.m3u", "/music/\xFF.pls"}));
+    EXPECT_EQ(catalogue->playlists("").size(), 3U);
+    EXPECT_EQ(catalogue->playlists("/music/b.m3u").size(), 1U);
 }
 
 ZANO_FOR_EVERY_ENGINE(ListingTest);

@@ -211,10 +211,12 @@ std::string IndexTest::nameOf(const ZANO_MEDIA_INFO &row) const {
 }
 
 std::vector<std::string> IndexTest::rows(
-    const std::function<std::string(const ZANO_MEDIA_INFO &)> &toLine, const char *select) const {
+    const std::function<std::string(const ZANO_MEDIA_INFO &)> &toLine, const char *select,
+    mediadb::Table table) const {
     const auto engine = mediadb::sqlite::makeEngine(databaseFile());
     mediadb::Query query;
-    query.select = mediadb::parseSelect(mediadb::Table::Songs, select);
+    query.table = table;
+    query.select = mediadb::parseSelect(table, select);
     mediadb::parseOrder("path", query);
     const auto cursor = engine->open(query);
     std::vector<std::string> lines;
@@ -236,6 +238,14 @@ std::vector<std::string> IndexTest::songs() const {
              << row.disc;
         return line.str();
     });
+}
+
+std::vector<std::string> IndexTest::playlists() const {
+    return rows(
+        [this](const ZANO_MEDIA_INFO &row) {
+            return nameOf(row) + '|' + row.title + '|' + row.album;
+        },
+        nullptr, mediadb::Table::Playlists);
 }
 
 std::vector<std::string> IndexTest::paths() const {

@@ -11,6 +11,7 @@
 #include <vector>
 
 #include "mediadb/catalogue.h"
+#include "mediadb/query/columns.h"
 
 namespace zano::index {
 
@@ -83,11 +84,15 @@ class IndexTest : public testing::Test {
     std::vector<std::string> paths() const;
     std::vector<std::string> sounds() const;
 
+    /* All playlists in order of their paths: "path below the music folder|title|folder". */
+    std::vector<std::string> playlists() const;
+
     fs::path folder_;
 
   private:
     std::vector<std::string> rows(const std::function<std::string(const ZANO_MEDIA_INFO &)> &toLine,
-                                  const char *select = nullptr) const;
+                                  const char *select = nullptr,
+                                  mediadb::Table table = mediadb::Table::Songs) const;
     std::string nameOf(const ZANO_MEDIA_INFO &row) const;
 };
 

@@ -125,6 +125,40 @@ TEST_F(ScanTest, FolderThatLostItsSongsKeepsItsRows) {
     }
 }
 
+TEST_F(ScanTest, PlaylistsAreListedWhileTheirFilesAreThere) {
+    addMany("a", 3);
+    fs::create_directories(music() + "/playlists");
+    fs::create_directories(music() + "/b");
+    for (const char *name : {"a/x.m3u", "playlists/S\u00F6mmer.M3U8", "playlists/caf\xE9.pls",
+                             "playlists/.hidden.m3u", "playlists/m3u", "b/only.wpl"}) {
+        write(music() + "/" + name, "0.ogg\n");
+    }
+    fs::create_symlink(music() + "/a/x.m3u", music() + "/playlists/link.m3u");
+    const Lines all = {
+        "a/x.m3u|x|a", "b/only.wpl|only|b", "playlists/S\u00F6mmer.M3U8|S\u00F6mmer|playlists",
+        "playlists/caf\xE9.pls|caf\u00E9|playlists", "playlists/link.m3u|link|playlists"};
+    auto summary = summaryOf({music()});
+    EXPECT_EQ(summary["playlistsAdded"], 5);
+    EXPECT_EQ(summary["files"], 3);
+    EXPECT_EQ(playlists(), all);
+    const auto before = databaseContent();
+    EXPECT_EQ(summaryOf({music()})["playlistsAdded"], 0);
+    EXPECT_EQ(databaseContent(), before);
+
+    fs::rename(music() + "/playlists/link.m3u", music() + "/a/link.pls");
+    summary = summaryOf({music() + "/a", music() + "/playlists"});
+    EXPECT_EQ(summary["playlistsAdded"], 1);
+    EXPECT_EQ(summary["playlistsRemoved"], 1);
+
+    // what is empty may be a disk that is not mounted
+    fs::remove(music() + "/b/only.wpl");
+    EXPECT_EQ(summaryOf({music() + "/b"})["playlistsRemoved"], 0);
+    fs::rename(music() + "/a", folder_ / "elsewhere");
+    EXPECT_EQ(summaryOf({music() + "/a"}, 1)["playlistsRemoved"], 0);
+    EXPECT_EQ(summaryOf({"--prune", music()})["playlistsRemoved"], 3);
+    EXPECT_EQ(playlists().size(), 2U);
+}
+
 TEST_F(ScanTest, HalfIsNotMoreThanHalf) {
     addMany("a", 4);
     run({music()});

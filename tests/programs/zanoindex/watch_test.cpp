@@ -70,6 +70,12 @@ TEST_F(WatchTest, FollowsFilesAndFolders) {
     fs::create_symlink(music() + "/b/2.mp3", music() + "/b/soft.mp3");
     await(3, 0, 0);
 
+    // a playlist comes and goes
+    write(music() + "/b/list.m3u", "2.mp3\n");
+    EXPECT_EQ(parsed(process_->readLine())["playlistsAdded"], 1);
+    fs::remove(music() + "/b/list.m3u");
+    EXPECT_EQ(parsed(process_->readLine())["playlistsRemoved"], 1);
+
     // moved out, and deleted
     fs::rename(music() + "/album", folder_ / "elsewhere/album");
     fs::remove_all(music() + "/renamed");
