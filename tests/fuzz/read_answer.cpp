@@ -3,20 +3,15 @@
 #include <vorelix/upnp/dmaparser.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <cstring>
 #include <iterator>
 #include <string>
 #include <string_view>
 
+#include "require.h"
+
 namespace vorelix::fuzz {
 namespace {
-
-void require(bool isSo) {
-    if (!isSo) {
-        std::abort();
-    }
-}
 
 constexpr std::string_view kEntities[] = {"&apos;", "&quot;", "&nbsp;", "&lt;", "&gt;", "&amp;"};
 

@@ -1,21 +1,17 @@
 #include "read_playlist.h"
 
-#include <cstdlib>
 #include <cstring>
 #include <string>
 
 #include "playlists/format.h"
 #include "playlists/locations.h"
 #include "playlists/text.h"
+#include "require.h"
 
 namespace zano::playlists {
 namespace {
 
-void require(bool isSo) {
-    if (!isSo) {
-        std::abort();
-    }
-}
+using vorelix::fuzz::require;
 
 bool isPath(std::string_view path) {
     return !path.empty() && path.front() == '/' && path.find('\0') == std::string_view::npos;

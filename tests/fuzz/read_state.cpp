@@ -11,7 +11,6 @@
 
 #include <algorithm>
 #include <climits>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <memory>
@@ -19,6 +18,7 @@
 #include <string>
 
 #include "config/line_internal.h"
+#include "require.h"
 #include "system_paths_internal.h"
 
 // Failures are what inputs are for; nobody's log is filled with them.
@@ -31,12 +31,6 @@ void fortifiedSyslog(int, int, const char *, ...) {}
 
 namespace vorelix::fuzz {
 namespace {
-
-void require(bool isSo) {
-    if (!isSo) {
-        std::abort();
-    }
-}
 
 /* A file in memory. */
 class MemoryFile {
