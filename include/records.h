@@ -74,5 +74,8 @@ VORELIX_STATIC_ASSERT(offsetof(ZANO_MEDIA_INFO, frequency) == 6248, "layout is a
 VORELIX_STATIC_ASSERT(sizeof(ZANO_MEDIA_INFO) == 7336, "layout is an interface");
 VORELIX_STATIC_ASSERT(offsetof(ZANO_PLAYLIST_REC, next) == 7336, "layout is an interface");
 VORELIX_STATIC_ASSERT(sizeof(ZANO_PLAYLIST_REC) == 7344, "layout is an interface");
+VORELIX_STATIC_ASSERT(offsetof(ZANO_PLAYLIST, title) == 4, "layout is an interface");
+VORELIX_STATIC_ASSERT(offsetof(ZANO_PLAYLIST, path) == 259, "layout is an interface");
+VORELIX_STATIC_ASSERT(offsetof(ZANO_PLAYLIST, album) == 4355, "layout is an interface");
 
 #endif

@@ -38,13 +38,14 @@ enum {
     MEDIA_TABLE_SONG_PATHS = 4 /* the songs again, asked by id for their path */
 };
 
-/* An open result. Only the fourth field is for callers. */
+/* An open result. Only the fourth field is for callers; the first three are what it was opened
+ * with. */
 typedef struct MEDIA_DB_RESULT {
     int tableKind;
     int offset;
     int limit;
     int rowCount; /* rows of the whole query when offset and limit are 0, else 0 */
-    void *cursor;
+    void *cursor; /* the platform's own */
 } MEDIA_DB_RESULT;
 
 VORELIX_STATIC_ASSERT(offsetof(MEDIA_DB_RESULT, rowCount) == 12, "the fourth field of 32 bits");
@@ -72,8 +73,9 @@ ZANOPLATFORM_API int MediaInfoDBGet(MEDIA_DB_RESULT *result, ZANO_MEDIA_INFO *ro
 /* Releases a handle; null is allowed. */
 ZANOPLATFORM_API void MediaInfoDBClose(MEDIA_DB_RESULT *result);
 
-/* COUNT(countExpression) under the condition: "*", a column, or "DISTINCT column". The last two
- * arguments are 0. The count, or -1. */
+/* COUNT(countExpression) under the condition: "*", a column, or "DISTINCT column"; a null condition
+ * counts all rows. The last two arguments are 0. The count, or -1: bad text, no database, or out of
+ * time. */
 ZANOPLATFORM_API int MediaInfoDBGetCount(int table, const char *countExpression,
                                          const char *condition, int, int);
 

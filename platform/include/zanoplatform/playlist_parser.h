@@ -1,4 +1,5 @@
-/* Reads playlist files: m3u and m3u8, pls, wpl. Any thread.
+/* Reads playlist files: m3u, m3u8 and pls, which have no standard, and wpl, XML after W3C's SMIL.
+ * URIs are those of RFC 3986, file: URIs of RFC 8089. Any thread.
  *
  * What is read: UTF-8 with or without BOM, UTF-16, else Windows-1252; lines that end in LF, CRLF
  * or CR; every extended line that the library writes. Relative entries are taken from the

@@ -12,7 +12,8 @@
 /* A view of the settings file, read once when the object is made. Blank lines and lines that
  * begin with # are skipped, spaces around key and value and one pair of quotes around the value
  * are dropped; of two lines with one key the last counts. A missing or unreadable file is an
- * empty one. */
+ * empty one; of a larger one the first MiB is read. Both functions throw std::bad_alloc when memory
+ * runs out. Any thread. */
 class ZANOPLATFORM_API ZanoConf {
   public:
     ZanoConf();

@@ -17,11 +17,11 @@ ZANOPLATFORM_API char *KLIBCStrTrimSpace(char *text);
 
 /* A list of texts. It owns copies of its items. */
 typedef struct SZLIST {
-    int capacity;
-    int count; /* number of items */
-    int sorted;
+    int capacity; /* items that there is room for */
+    int count;    /* number of items */
+    int sorted;   /* not 0: KLIBCSzListSortItems keeps it sorted */
     int reserved;
-    char **items;
+    char **items; /* texts from malloc, the list's own */
 } SZLIST, *PSZLIST;
 
 /* A list with room for `capacity` items (it grows beyond); null when out of memory or the
@@ -38,11 +38,12 @@ ZANOPLATFORM_API int KLIBCStrSep(const char *text, const char *separator, PSZLIS
 /* The item at an index from 0; null outside the list. Valid until the list changes. */
 ZANOPLATFORM_API const char *KLIBCSzListGet(PSZLIST list, int index);
 
-/* The index of the first item equal to text, or -1. A sorted list is searched by halving. */
+/* The index of the first item equal to text, byte for byte; -1 when there is none, and for a null
+ * argument. A sorted list is searched by halving. */
 ZANOPLATFORM_API int KLIBCSzListFind(PSZLIST list, const char *text);
 
 /* Not 0: sorts the items by their bytes, and keeps the list sorted when it is filled anew. 0: new
- * items keep their order again. */
+ * items keep their order again. A null list is left alone. */
 ZANOPLATFORM_API void KLIBCSzListSortItems(PSZLIST list, int keepSorted);
 
 ZANOPLATFORM_C_API_END

@@ -1,4 +1,5 @@
-/* The answer of a CGI program: header and JSON body on its standard output. */
+/* The answer of a CGI program (CGI/1.1, RFC 3875): header and JSON body (RFC 8259) on its standard
+ * output. One thread at a time. */
 #ifndef ZANOPLATFORM_WEB_OUTPUT_H
 #define ZANOPLATFORM_WEB_OUTPUT_H
 
