@@ -72,6 +72,12 @@ std::string withoutLinks(const std::string &path) {
     return error ? path : target.string();
 }
 
+mode_t modeOfNewFile(mode_t mode) {
+    const mode_t mask = umask(0);
+    umask(mask);
+    return mode & ~mask;
+}
+
 FileDraft::FileDraft(const std::string &file, Deadline deadline)
     : file_(file), path_(draftPathOf(file)) {
     try {

@@ -28,6 +28,9 @@ std::string reasonOf(int error);
 /* The path that a rename may go to: of a link what it leads to. */
 std::string withoutLinks(const std::string &path);
 
+/* What is left of a mode in a file that this process makes. */
+mode_t modeOfNewFile(mode_t mode);
+
 class FileDraft {
   public:
     /* Waits until nobody else has a draft of the file (absolute path), which need not be there.

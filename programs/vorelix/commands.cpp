@@ -1,5 +1,7 @@
 #include "commands.h"
 
+#include "state_options.h"
+
 namespace vorelix {
 
 const std::vector<Command> &allCommands() {
@@ -43,6 +45,30 @@ const std::vector<Command> &allCommands() {
         {"users remove", "Remove the entry of a user, who may stream then", kUser,
          usersRemoveCommand},
         {"users sync", "Remove the entries of users that are gone", 0, usersSyncCommand},
+        {"queue", "Show and change a player's queue", 0, nullptr},
+        {"queue show", "Show the songs of a queue", kPaging | kWait, queueShowCommand,
+         addQueueFile},
+        {"queue save", "Make a queue of songs", kSongs | kNoSongs | kForce | kWait,
+         queueSaveCommand, addQueueFile},
+        {"queue append", "Add songs at the end of a queue", kSongs | kWait, queueAppendCommand,
+         addQueueFile},
+        {"queue random", "Make a queue of songs by chance", kNumber | kForce | kWait,
+         queueRandomCommand, addQueueFile},
+        {"config", "Show and change the configuration", 0, nullptr},
+        {"config get", "Show the settings, or one of them", 0, configGetCommand,
+         addOptionalSetting},
+        {"config set", "Set a setting", kWait, configSetCommand, addSetting},
+        {"config restore", "Make the file of the settings where there is none", kWait,
+         configRestoreCommand},
+        {"config print", "Print what the library reads", 0, configPrintCommand},
+        {"keys", "Show and change the custom keys", 0, nullptr},
+        {"keys get", "Show the custom keys, or one of them", 0, keysGetCommand, addOptionalKey},
+        {"keys set", "Set a custom key", kWait, keysSetCommand, addKey},
+        {"ipod", "Show what is on the attached iPod", 0, nullptr},
+        {"ipod tracks", "List its tracks", kPaging, ipodTracksCommand},
+        {"ipod track", "Show all that is known of a track", 0, ipodTrackCommand, addTrackNumber},
+        {"ipod playlists", "List its playlists", 0, ipodPlaylistsCommand},
+        {"ipod songs", "List the tracks of a playlist", kPaging, ipodSongsCommand, addIPodPlaylist},
     };
     return commands;
 }

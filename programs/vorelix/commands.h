@@ -54,4 +54,32 @@ Outcome usersSetCommand(const Request &request, const Terminal &terminal);
 Outcome usersRemoveCommand(const Request &request, const Terminal &terminal);
 Outcome usersSyncCommand(const Request &request, const Terminal &terminal);
 
+/* Of a player's queue; each document has "queue": {"path", "state": [3 numbers]}, "total":
+ *   show                    "entries": [...], "offset", "limit", "trailingBytes" too */
+Outcome queueShowCommand(const Request &request, const Terminal &terminal);
+Outcome queueSaveCommand(const Request &request, const Terminal &terminal);
+Outcome queueAppendCommand(const Request &request, const Terminal &terminal);
+Outcome queueRandomCommand(const Request &request, const Terminal &terminal);
+
+/* get, set   {"settings": [{"key", "value"}, ...]}
+ * restore    {"file", "made": true}
+ * print      {"currentSource", "playMode", "defaultMusicPlaylist", "defaultIPodPlaylist"} */
+Outcome configGetCommand(const Request &request, const Terminal &terminal);
+Outcome configSetCommand(const Request &request, const Terminal &terminal);
+Outcome configRestoreCommand(const Request &request, const Terminal &terminal);
+Outcome configPrintCommand(const Request &request, const Terminal &terminal);
+
+/* {"keys": [{"key", "type", "value", "title"}, ...]} */
+Outcome keysGetCommand(const Request &request, const Terminal &terminal);
+Outcome keysSetCommand(const Request &request, const Terminal &terminal);
+
+/* tracks      {"tracks": [...], "offset", "limit", "total"}, songs with their "position"
+ * songs       "playlist": {"title", "path"} too
+ * track       {"track": song}
+ * playlists   {"playlists": [{"title", "path"}, ...], "total"} */
+Outcome ipodTracksCommand(const Request &request, const Terminal &terminal);
+Outcome ipodTrackCommand(const Request &request, const Terminal &terminal);
+Outcome ipodPlaylistsCommand(const Request &request, const Terminal &terminal);
+Outcome ipodSongsCommand(const Request &request, const Terminal &terminal);
+
 }  // namespace vorelix

@@ -21,4 +21,8 @@ CLI::Validator wholeNumber(int least, int most) {
             ""};
 }
 
+CLI::Validator notEmpty() {
+    return {[](std::string &text) { return text.empty() ? "it is empty" : std::string(); }, ""};
+}
+
 }  // namespace vorelix

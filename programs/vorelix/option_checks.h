@@ -8,4 +8,6 @@ namespace vorelix {
 /* The whole text in decimal; CLI11 by itself takes 010 for 8. */
 CLI::Validator wholeNumber(int least, int most);
 
+CLI::Validator notEmpty();
+
 }  // namespace vorelix

@@ -157,6 +157,9 @@ struct Parser {
                 sub.require_subcommand(0, 1);
                 continue;
             }
+            if (command.addOwn != nullptr) {
+                command.addOwn(sub, request);
+            }
             addOperands(sub, command.arguments, request);
             addFilter(sub, command.arguments, request);
             addOrder(sub, command.arguments, request);

@@ -1,5 +1,4 @@
 /* playlist create, import and export. */
-#include <sys/stat.h>
 #include <unistd.h>
 #include <cstring>
 #include <deque>
@@ -142,9 +141,7 @@ Outcome playlistExportCommand(const Request &request, const Terminal &) {
     const std::string file = absolutePath(wanted.file);
     Draft draft = draftOf(file, wanted);
     const SongList list = readEntries(playlist.path);
-    const mode_t mask = umask(0);
-    umask(mask);
-    draft.write(entriesOf(list), kSharedMode & ~mask);
+    draft.write(entriesOf(list), modeOfNewFile(kSharedMode));
     if (wanted.force) {
         draft.putInPlace();
     } else {

@@ -13,10 +13,6 @@ namespace {
 
 constexpr int kMostWaitSeconds = 3600;
 
-CLI::Validator notEmpty() {
-    return {[](std::string &text) { return text.empty() ? "it is empty" : std::string(); }, ""};
-}
-
 CLI::Validator songId() {
     const CLI::Validator number = wholeNumber(1, std::numeric_limits<int>::max());
     return {[number](std::string &text) { return text == "-" ? "" : number(text); }, ""};

@@ -1,11 +1,16 @@
 /* A command line, understood. */
 #pragma once
 
+#include <optional>
 #include <string>
 #include <vector>
 
 #include "songs.h"
 #include "terminal.h"
+
+namespace CLI {  // NOLINT(readability-identifier-naming): the parser's own
+class App;
+}
 
 namespace vorelix {
 
@@ -54,6 +59,7 @@ struct Command {
     const char *description;
     unsigned arguments;
     Outcome (*run)(const Request &request, const Terminal &terminal);  // null: a group of commands
+    void (*addOwn)(CLI::App &app, Request &request) = nullptr;  // arguments of this command alone
 };
 
 /* What playlist commands were given; positions as readRange takes them. */
@@ -77,6 +83,16 @@ struct UsersRequest {
     std::vector<std::string> rights;
 };
 
+/* What the commands of queue, configuration, custom keys and iPod were given. */
+struct StateRequest {
+    std::string name;   // a queue's file, a setting's key, an iPod's playlist
+    std::string value;  // of a setting
+    int number = 0;     // of a custom key or a track; 0: all
+    std::optional<std::string> type;
+    std::optional<std::string> keyValue;
+    std::optional<std::string> title;
+};
+
 struct Request {
     const Command *command = nullptr;
     std::vector<std::string> words;  // the whole command line as it was typed
@@ -90,6 +106,7 @@ struct Request {
     std::vector<int> ids;
     PlaylistRequest playlist;
     UsersRequest users;
+    StateRequest state;
 };
 
 }  // namespace vorelix
