@@ -28,6 +28,7 @@ check() {
 check 'syslog\.h' 'include/log_internal\.h:|platform/|programs/[a-z]+/main\.cpp:'
 check 'sqlite3(ext)?\.h' 'platform/mediadb/sqlite/'
 check 'taglib/.*|fileref\.h|tag\.h' 'programs/zanoindex/'
+check 'gpod/.*' 'programs/zanoipod/ipod\.cpp:'
 check 'utf8proc\.h' 'platform/text/|programs/playlists/text\.cpp:'
 check '(postgresql/)?libpq(-fe|/.*)?\.h' 'platform/mediadb/postgresql/'
 check 'curl/.*' 'upnp/'
