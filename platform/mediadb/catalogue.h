@@ -28,6 +28,10 @@ class DatabaseError : public std::runtime_error {
     int code_;
 };
 
+/* A text for users or logs in which the password of a database's address, if it has one, is
+ * replaced by stars wherever it stands. */
+std::string withoutPassword(std::string text, const std::string &location);
+
 /* What tells that a file changed. Times in nanoseconds since the epoch, size in bytes. */
 struct FileStamp {
     std::int64_t size = 0;

@@ -53,6 +53,10 @@ class Engine {
     Engine() = default;
 };
 
+/* The engine of a location, as the setting mediadb names one. Throws DatabaseError when it names
+ * none. */
+std::unique_ptr<Engine> makeEngine(const std::string &location);
+
 /* How long a query may take, in milliseconds. */
 constexpr int kQueryLimitMs = 5000;
 

@@ -43,7 +43,7 @@ std::pair<const EngineKind *, std::string> engineOf(const std::string &location)
     throw DatabaseError(KLIB_ERR_BAD_CONFIGURATION,
                         "the setting mediadb is neither \"sqlite:\" and an absolute path nor a "
                         "\"postgresql://\" address: " +
-                            location);
+                            withoutPassword(location, location));
 }
 
 /* The engine of the current settings. Their file is looked at again in every clock tick, so that a
@@ -156,10 +156,49 @@ void requirePlaylists(int table, const void *argument) {
     }
 }
 
+/* What may be a password in an address that need not be a right one: what stands between the first
+ * colon and the last @ before the path, and the parameter of that name. */
+std::vector<std::string> passwordsIn(const std::string &location) {
+    std::vector<std::string> found;
+    const size_t scheme = location.find("://");
+    const size_t host = scheme == std::string::npos ? std::string::npos : scheme + 3;
+    const size_t at = location.rfind('@');
+    const size_t colon = location.find(':', host);
+    if (host != std::string::npos && at != std::string::npos && colon < at) {
+        found.push_back(location.substr(colon + 1, at - colon - 1));
+    }
+    for (size_t begin = location.find_first_of("?&"); begin != std::string::npos;
+         begin = location.find('&', begin + 1)) {
+        constexpr std::string_view kNames[] = {"password=", "sslpassword="};
+        for (const std::string_view name : kNames) {
+            if (location.compare(begin + 1, name.size(), name) == 0) {
+                const size_t value = begin + 1 + name.size();
+                found.push_back(location.substr(value, location.find('&', value) - value));
+            }
+        }
+    }
+    return found;
+}
+
 }  // namespace
+
+std::string withoutPassword(std::string text, const std::string &location) {
+    for (const std::string &password : passwordsIn(location)) {
+        for (size_t at = text.find(password); !password.empty() && at != std::string::npos;
+             at = text.find(password, at + 3)) {
+            text.replace(at, password.size(), "***");
+        }
+    }
+    return text;
+}
 
 std::string configuredLocation() {
     return ZanoConf().Info("mediadb", "sqlite:" ZANO_PATH_MEDIA_DB);
+}
+
+std::unique_ptr<Engine> makeEngine(const std::string &location) {
+    const auto [kind, place] = engineOf(location);
+    return kind->make(place);
 }
 
 std::unique_ptr<Catalogue> openCatalogue() {

@@ -42,7 +42,8 @@ int useDatabase(const std::string &location, Action action) {
     try {
         return action(location);
     } catch (const mediadb::DatabaseError &error) {
-        printError("the media database " + location + " could not be used: " + error.what() +
+        printError("the media database " + mediadb::withoutPassword(location, location) +
+                   " could not be used: " + error.what() +
                    "\nWhat was written before stays. See to the cause and run again.");
         return kFailure;
     }

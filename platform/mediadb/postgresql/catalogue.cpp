@@ -1,6 +1,8 @@
 #include <zanoplatform/error.h>
 
+#include <algorithm>
 #include <cstdlib>
+#include <span>
 #include <unordered_map>
 #include <utility>
 
@@ -15,6 +17,8 @@ namespace {
 /* Songs are sent in pieces of this number, since a question for each would take most of the time.
  */
 constexpr size_t kSongsAtOnce = 1000;
+/* A batch of more songs than these is written in several goes, so that its memory is bounded. */
+constexpr size_t kSongsHeld = 20000;
 /* The planner's numbers are made anew when a fifth of the songs has come or gone. */
 constexpr std::int64_t kRecountShare = 5;
 /* Held by who sets anchors; any number that all programs of this kind use. */
@@ -22,11 +26,18 @@ constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
 constexpr const char *kUnlockAnchors = "SELECT pg_advisory_unlock(1517118562, 2)";
 constexpr const char *kSnapshot = "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ";
 
-/* Several programs write at once: the rows of their songs are their own, and the rows that all of
- * them write, facets and state, are written last and in one order. */
+/* While another program makes indexes or writes a batch. */
+constexpr const char *kPatience = "SET lock_timeout='15min'";
+/* Several programs write at once, perhaps the same songs and always the same counts. So that they
+ * never wait for each other in a circle, a batch is written in one go, under a lock on this row,
+ * which any engine has. */
+constexpr const char *kLockWriting = "SELECT value FROM state WHERE name='generation' FOR UPDATE";
+
 class PostgresqlCatalogue : public Catalogue {
   public:
-    explicit PostgresqlCatalogue(const std::string &uri) : connection_(openForWriting(uri)) {}
+    explicit PostgresqlCatalogue(const std::string &uri) : connection_(openForWriting(uri)) {
+        connection_.run(std::string(kPatience));
+    }
     ~PostgresqlCatalogue() override { PostgresqlCatalogue::rollback(); }
 
     /* The range ends at "folder0", '0' being the character behind '/'. It comes from the index in
@@ -64,13 +75,12 @@ class PostgresqlCatalogue : public Catalogue {
         }
     }
 
-    void begin() override { open("BEGIN"); }
+    void begin() override { open("BEGIN TRANSACTION ISOLATION LEVEL READ COMMITTED"); }
 
     void commit() override {
         flush();
         if (isChanged_) {
             writeFacets();
-            /* First the row that every batch changes, so that batches come one after another. */
             addToState("generation", 1);
             addToState("songs", songs_);
             for (const auto &[name, change] : facetCounts_) {
@@ -99,12 +109,13 @@ class PostgresqlCatalogue : public Catalogue {
         } else {
             pending_[place->second] = song;
         }
-        if (pending_.size() >= kSongsAtOnce) {
+        if (pending_.size() >= kSongsHeld) {
             flush();
         }
     }
 
     bool removeSong(const std::string &path) override {
+        lockWriting();
         if (placeOf_.count(path) > 0) {
             flush();
         }
@@ -152,12 +163,17 @@ class PostgresqlCatalogue : public Catalogue {
     }
 
     void finish(const Progress &progress) override {
-        if (state("anchored") == state("generation")) {
+        const bool isIndexed = state("indexed") != 0;
+        if (isIndexed && state("anchored") == state("generation")) {
             return;
         }
         connection_.run(std::string(kLockAnchors));
         try {
-            setAnchors(progress);
+            Steps steps(progress, isIndexed ? 0 : kIndexSteps);
+            if (!isIndexed) {
+                makeIndexes(steps);
+            }
+            setAnchors(steps);
         } catch (...) {
             rollback();
             if (!connection_.isBroken()) {
@@ -204,6 +220,7 @@ class PostgresqlCatalogue : public Catalogue {
         connection_.run(std::string(how));
         isOpen_ = true;
         isChanged_ = false;
+        isWriting_ = false;
         songs_ = 0;
         pending_.clear();
         placeOf_.clear();
@@ -234,34 +251,44 @@ class PostgresqlCatalogue : public Catalogue {
         connection_.run(sql.add(" WHERE name=").bind(name));
     }
 
-    /* Sends what was put. A song that another program has inserted meanwhile is one that is known
-     * when it is looked for again. */
+    void lockWriting() {
+        if (!isWriting_) {
+            connection_.run(std::string(kLockWriting));
+            isWriting_ = true;
+        }
+    }
+
     void flush() {
-        while (!pending_.empty()) {
-            std::vector<Song> songs = std::move(pending_);
-            pending_.clear();
-            placeOf_.clear();
+        const std::vector<Song> songs = std::move(pending_);
+        pending_.clear();
+        placeOf_.clear();
+        for (size_t begin = 0; begin < songs.size(); begin += kSongsAtOnce) {
+            lockWriting();
             isChanged_ = true;
-            const auto stored = loadSongs(connection_, songs);
-            SongArrays changed;
-            SongArrays added;
-            std::map<std::string, Song *> missing;
-            for (Song &song : songs) {
-                const auto known = stored.find(song.path);
-                if (known == stored.end()) {
-                    added.add(song, 0);
-                    missing.emplace(song.path, &song);
-                    continue;
-                }
+            write(std::span(songs).subspan(begin, std::min(kSongsAtOnce, songs.size() - begin)));
+        }
+    }
+
+    void write(std::span<const Song> songs) {
+        const auto stored = loadSongs(connection_, songs);
+        SongArrays changed;
+        SongArrays added;
+        for (const Song &song : songs) {
+            const auto known = stored.find(song.path);
+            if (known != stored.end()) {
                 changed.add(song, known->second.id);
                 noteChange(known->second, song);
+                continue;
             }
-            if (!changed.isEmpty()) {
-                connection_.run(changed.replacement());
-            }
-            if (!added.isEmpty()) {
-                insert(added, missing);
-            }
+            added.add(song, 0);
+            countFacets(facetChanges_, song.artist, song.album, song.genre, 1);
+            ++songs_;
+        }
+        if (!changed.isEmpty()) {
+            connection_.run(changed.replacement());
+        }
+        if (!added.isEmpty()) {
+            connection_.run(added.insertion());
         }
     }
 
@@ -269,20 +296,6 @@ class PostgresqlCatalogue : public Catalogue {
         if (!before.isShownAs(now)) {
             countFacets(facetChanges_, before.artist, before.album, before.genre, -1);
             countFacets(facetChanges_, now.artist, now.album, now.genre, 1);
-        }
-    }
-
-    void insert(SongArrays &added, std::map<std::string, Song *> &missing) {
-        const Result rows = connection_.run(added.insertion());
-        for (int i = 0; i < rows.size(); ++i) {
-            const auto song = missing.find(std::string(rows[i].text(0)));
-            countFacets(facetChanges_, song->second->artist, song->second->album,
-                        song->second->genre, 1);
-            ++songs_;
-            missing.erase(song);
-        }
-        for (const auto &[path, song] : missing) {
-            putSong(*song);
         }
     }
 
@@ -319,16 +332,33 @@ class PostgresqlCatalogue : public Catalogue {
         return std::string(facets().at(static_cast<size_t>(number) - 1).state);
     }
 
-    void setAnchors(const Progress &progress) {
+    /* Tells how far the end of a scan is. */
+    class Steps {
+      public:
+        Steps(const Progress &progress, int indexes)
+            : progress_(progress), total_(indexes + static_cast<int>(storedOrders().size()) + 1) {}
+        void operator()() {
+            if (progress_) {
+                progress_(++done_, total_);
+            }
+        }
+
+      private:
+        const Progress &progress_;
+        int done_ = 0;
+        int total_;
+    };
+
+    void makeIndexes(Steps &step) {
+        open("BEGIN");
+        addIndexes(connection_, [&step] { step(); });
+        setState("indexed", 1);
+        close();
+    }
+
+    void setAnchors(Steps &step) {
         open(kSnapshot);
         const std::int64_t generation = state("generation");
-        const int total = static_cast<int>(storedOrders().size()) + 1;
-        int done = 0;
-        const auto step = [&] {
-            if (progress) {
-                progress(++done, total);
-            }
-        };
         connection_.run(
             "CREATE TEMPORARY TABLE ordered ON COMMIT DROP AS SELECT id, path, title_key, "
             "album_key, artist_key, genre_key, year, duration, row_number() OVER (ORDER BY " +
@@ -348,11 +378,16 @@ class PostgresqlCatalogue : public Catalogue {
         close();
     }
 
-    /* Without them the server would guess how often words come. */
+    /* Without them the server would guess how often words come. Vacuuming lets it answer counts
+     * from indexes alone, and empties the list of what the search index has yet to take in. */
     void refreshStatistics() {
         const std::int64_t songs = state("songs");
         if (std::abs(songs - state("counted")) * kRecountShare > songs) {
-            connection_.run(std::string("ANALYZE songs, facets, playlists, anchors"));
+            try {
+                connection_.run(std::string("VACUUM (ANALYZE) songs, facets, playlists, anchors"));
+            } catch (const ServerError &) {
+                connection_.run(std::string("ANALYZE"));  // of an engine that has nothing to vacuum
+            }
             setState("counted", songs);
         }
     }
@@ -406,6 +441,7 @@ class PostgresqlCatalogue : public Catalogue {
 
     /* Of the batch. */
     bool isChanged_ = false;
+    bool isWriting_ = false;  // under the lock
     std::int64_t songs_ = 0;  // come, less those gone
     std::vector<Song> pending_;
     std::unordered_map<std::string, size_t> placeOf_;

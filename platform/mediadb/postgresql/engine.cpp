@@ -67,7 +67,8 @@ class StatementCursor : public BaseCursor {
     bool isPiecewise() const { return query().limit == 0 || query().limit > kRowsAtOnce; }
 
     /* Prepares too, so that a text that the engine refuses fails when the query is opened. */
-    void setSql(const Sql &sql) {
+    void setSql(const Sql &sql, Connection::Plan plan = Connection::Plan::ForValues) {
+        sqlPlan_ = plan;
         sql_ = newSql(isPiecewise() ? "DECLARE listing NO SCROLL CURSOR FOR " : "");
         sql_.append(sql);
         connection().check(sql_);
@@ -76,7 +77,7 @@ class StatementCursor : public BaseCursor {
   private:
     void fetch(Connection &server) {
         if (!isPiecewise()) {
-            setRows(server.run(sql_));
+            setRows(server.run(sql_, sqlPlan_));
             return;
         }
         if (!isDeclared_) {
@@ -88,6 +89,7 @@ class StatementCursor : public BaseCursor {
     }
 
     Sql sql_;
+    Connection::Plan sqlPlan_ = Connection::Plan::ForValues;
     bool isDeclared_ = false;
     bool isDone_ = false;
 };
@@ -97,9 +99,11 @@ class SongCursor : public StatementCursor {
     SongCursor(ReaderPool::Lease lease, Query asked)
         : StatementCursor(std::move(lease), std::move(asked)), plan_(reader(), query().condition) {
         if (const auto facets = plan_.facetPage(query())) {
-            setSql(*facets);
+            setSql(*facets, Connection::Plan::Kept);
         } else {
-            setSql(query().distinct ? plan_.distinctPage(query()) : plan_.page(query()));
+            setSql(
+                query().distinct ? plan_.distinctPage(query()) : plan_.page(query()),
+                plan_.isPlanKept(query()) ? Connection::Plan::Kept : Connection::Plan::ForValues);
         }
     }
 

@@ -184,10 +184,11 @@ Connection::Connection(const std::string &uri, Access access) {
     }
     libpq().setNoticeReceiver(connection_.get(), ignoreNotice, nullptr);
     if (isBroken()) {
-        throw DatabaseError(KLIB_ERR_DATABASE_OPEN,
-                            std::string("could not connect to the media database") +
-                                (isWriter ? " for writing: " : ": ") +
-                                firstLine(libpq().errorMessage(connection_.get())));
+        throw DatabaseError(
+            KLIB_ERR_DATABASE_OPEN,
+            std::string("could not connect to the media database") +
+                (isWriter ? " for writing: " : ": ") +
+                withoutPassword(firstLine(libpq().errorMessage(connection_.get())), uri));
     }
     const char *encoding = libpq().parameterStatus(connection_.get(), "server_encoding");
     if (encoding == nullptr || std::string_view(encoding) != "UTF8") {
@@ -208,6 +209,8 @@ void Connection::applySettings(Access access) {
     try {
         run(needed +
             "; SET plan_cache_mode=force_custom_plan; SET cursor_tuple_fraction=1; SET jit=off");
+        knowsPlans_ = true;
+        plan_ = Plan::ForValues;
     } catch (const ServerError &error) {
         if (error.state() != "42704") {
             throw;
@@ -216,12 +219,13 @@ void Connection::applySettings(Access access) {
     }
 }
 
-Result Connection::checked(PGresult *made) const {
+Result Connection::checked(PGresult *made) {
     Result result(made);
     const ExecStatusType status = libpq().resultStatus(made);
     if (status == PGRES_COMMAND_OK || status == PGRES_TUPLES_OK) {
         return result;
     }
+    plan_.reset();  // a transaction that fails takes settings back
     const char *state =
         made != nullptr ? libpq().resultErrorField(made, PG_DIAG_SQLSTATE) : nullptr;
     const char *words =
@@ -231,6 +235,20 @@ Result Connection::checked(PGresult *made) const {
         "the media database could not answer: " +
             firstLine(words != nullptr ? words : libpq().errorMessage(connection_.get())),
         state != nullptr ? state : "");
+}
+
+void Connection::usePlan(Plan plan) {
+    if (knowsPlans_ && plan_ != plan) {
+        run(std::string("SET plan_cache_mode=") +
+            (plan == Plan::Kept ? "force_generic_plan" : "force_custom_plan"));
+        plan_ = plan;
+    }
+}
+
+void Connection::runLater(const char *sql) {
+    if (libpq().sendQuery(connection_.get(), sql) == 0) {
+        checked(nullptr);
+    }
 }
 
 Result Connection::run(const std::string &sql) {

@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -84,10 +85,19 @@ class Connection {
     Result run(const std::string &sql);
     /* One statement of ours that is not kept. */
     Result runOnce(const char *sql);
+    /* Whether the server plans a statement for the very values that are bound, or once for all. */
+    enum class Plan { ForValues, Kept };
     /* One statement, with its values bound. */
-    Result run(const Sql &sql) { return execute(prepare(sql.text()), sql.values()); }
+    Result run(const Sql &sql, Plan plan = Plan::ForValues) {
+        usePlan(plan);
+        return execute(prepare(sql.text()), sql.values());
+    }
+    /* Without waiting for the end of it, or ever looking at it; the next statement waits. */
+    void runLater(const char *sql);
     /* So that a text that the server refuses fails before it is run. */
     void check(const Sql &sql) { prepare(sql.text()); }
+    /* Under which the server knows a statement from now until the next one is prepared. */
+    const std::string &nameOf(const std::string &sql) { return prepare(sql).name; }
     /* The first column of the first row; `fallback` when there is none. */
     std::int64_t integer(const Sql &sql, std::int64_t fallback = 0);
 
@@ -105,12 +115,15 @@ class Connection {
 
     const Prepared &prepare(const std::string &sql);
     Result execute(const Prepared &statement, const std::vector<Value> &values);
-    Result checked(PGresult *result) const;
+    void usePlan(Plan plan);
+    Result checked(PGresult *result);
     void applySettings(Access access);
 
     std::unique_ptr<PGconn, Finish> connection_;
     std::map<std::string, Prepared, std::less<>> prepared_;
     std::uint64_t names_ = 0;
+    bool knowsPlans_ = false;   // the server has a setting for them
+    std::optional<Plan> plan_;  // of the setting; null: not known
 };
 
 }  // namespace zano::mediadb::postgresql

@@ -44,6 +44,7 @@ Libpq load() {
     find(library, "PQresultErrorField", made.resultErrorField);
     find(library, "PQexec", made.exec);
     find(library, "PQexecParams", made.execParams);
+    find(library, "PQsendQuery", made.sendQuery);
     find(library, "PQprepare", made.prepare);
     find(library, "PQdescribePrepared", made.describePrepared);
     find(library, "PQnparams", made.nparams);

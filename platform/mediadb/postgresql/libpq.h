@@ -19,6 +19,7 @@ struct Libpq {
     decltype(&::PQresultErrorField) resultErrorField;
     decltype(&::PQexec) exec;
     decltype(&::PQexecParams) execParams;
+    decltype(&::PQsendQuery) sendQuery;
     decltype(&::PQprepare) prepare;
     decltype(&::PQdescribePrepared) describePrepared;
     decltype(&::PQnparams) nparams;

@@ -11,7 +11,7 @@ namespace {
 
 /* Songs outside of the music root that are counted before counting those inside instead. */
 constexpr std::int64_t kOutsideBound = 20000;
-/* A longer page is worth no anchor, for its rows are sorted once more. */
+/* Of a page that comes from an index; longer ones are fetched piece by piece. */
 constexpr std::int64_t kLongestAnchoredPage = 1000;
 
 const Facet *findFacet(Column column) {
@@ -30,64 +30,46 @@ std::optional<OrderTerm> leadingOf(const std::vector<OrderTerm> &order) {
     return isUnique ? order.front() : leadingTermOf(order);
 }
 
-/* What was read of an anchor, as it is bound again. */
-Value valueOf(const Row &row, int index, Column column) {
-    if (columnInfo(column).isText) {
-        return std::string(row.text(index));
-    }
-    if (column == Column::Duration) {
-        return row.real(index);
-    }
-    return row.integer(index);
-}
-
-std::vector<Column> placeColumns(Column leading) {
-    std::vector<Column> columns = {leading};
-    if (leading != Column::Id && leading != Column::Path) {
-        for (const OrderTerm &term : tieBreaks()) {
-            if (term.column != leading) {
-                columns.push_back(term.column);
-            }
-        }
-    }
+/* The columns that tell where in an order a song stands. */
+std::vector<std::string_view> placeColumns(Column leading) {
+    std::vector<std::string_view> columns = tailColumns(leading);
+    columns.insert(columns.begin(), orderColumn(leading));
     return columns;
 }
 
-/* Where a page begins: the values of the song at an anchor. */
-struct Place {
-    OrderTerm leading;
-    std::vector<Column> columns;
-    std::vector<Value> values;
-};
-
-void addList(Sql &sql, const Place &place, bool isOfValues) {
+/* "(album_key,disc) >= ((SELECT album_key FROM place),(SELECT disc FROM place))", which an index
+ * answers. Only columns of one direction are compared so. */
+void addComparison(Sql &sql, const std::vector<std::string_view> &columns, std::string_view how) {
     std::string_view separator = "(";
-    for (size_t i = 1; i < place.columns.size(); ++i) {
-        sql.add(separator);
-        if (isOfValues) {
-            sql.bind(place.values[i]);
-        } else {
-            sql.add(orderColumn(place.columns[i]));
-        }
+    for (const std::string_view column : columns) {
+        sql.add(separator).add(column);
+        separator = ",";
+    }
+    sql.add(")").add(how);
+    separator = "(";
+    for (const std::string_view column : columns) {
+        sql.add(separator).add("(SELECT ").add(column).add(" FROM place)");
         separator = ",";
     }
     sql.add(")");
 }
 
-/* One of the two stretches of an order from a place on, each of which an index gives in order:
- * what has the leading value of the place, and what lies behind that value. */
-void addStretch(Sql &sql, const Place &place, bool isSameValue, std::int64_t rows) {
-    const std::string_view column = orderColumn(place.leading.column);
+/* A number of ours as text: a plan that is kept has to know how few rows are wanted. */
+void addLimit(Sql &sql, std::int64_t rows) {
+    sql.add(" LIMIT ").add(std::to_string(rows));
+}
+
+/* One of the two stretches of a descending order from a place on, each of which an index gives in
+ * order: what has the leading value of the place, and what lies behind that value. */
+void addStretch(Sql &sql, const OrderTerm &leading, bool isSameValue, std::int64_t rows) {
+    const std::string_view column = orderColumn(leading.column);
     sql.add("(SELECT songs.*, ").add(isSameValue ? "0" : "1").add(" AS stretch FROM songs WHERE ");
-    sql.add(column);
-    sql.add(isSameValue ? "=" : place.leading.descending ? "<" : ">").bind(place.values[0]);
-    if (isSameValue && place.columns.size() > 1) {
-        sql.add(" AND ");
-        addList(sql, place, false);
-        sql.add(">=");
-        addList(sql, place, true);
+    addComparison(sql, {column}, isSameValue ? "=" : "<");
+    if (isSameValue) {
+        addComparison(sql.add(" AND "), tailColumns(leading.column), ">=");
     }
-    sql.add(" ORDER BY ").add(orderText(place.leading, "")).add(" LIMIT ").bind(rows).add(")");
+    addLimit(sql.add(" ORDER BY ").add(orderText(leading, "")), rows);
+    sql.add(")");
 }
 
 }  // namespace
@@ -113,45 +95,52 @@ void SongPlan::addWhere(Sql &sql) {
     }
 }
 
+/* What an index gives from a known place on, whatever the values. */
+bool SongPlan::isPlanKept(const Query &query) const {
+    const auto leading = leadingOf(query.order);
+    const bool isInOrder = leading && findStoredOrder(*leading) != nullptr;
+    const bool isShort = query.limit > 0 && query.limit <= kLongestAnchoredPage;
+    const bool isPlaceKnown =
+        query.offset == 0 || reader_.state().anchored == reader_.state().generation;
+    return conjuncts_.empty() && !query.random && !query.distinct && isInOrder && isShort &&
+           isPlaceKnown;
+}
+
 /* Deep pages of the whole library begin at the nearest anchor, if the anchors were set in the
  * very state of the catalogue that is being read. Where there is no anchor, there are no songs. */
 std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &query) {
-    const bool isUseful = query.offset >= kAnchorDistance && query.limit > 0 &&
-                          query.limit <= kLongestAnchoredPage &&
-                          reader_.state().anchored == reader_.state().generation;
-    if (!isUseful) {
+    if (query.offset == 0 || !isPlanKept(query)) {
         return std::nullopt;
     }
-    Place place{order.leading, placeColumns(order.leading.column), {}};
-    Sql find = newSql("SELECT ");
+    const OrderTerm &leading = order.leading;
+    const std::int64_t skipped = query.offset % kAnchorDistance;
+    const auto columns = placeColumns(leading.column);
+    Sql sql = newSql("WITH place AS MATERIALIZED (SELECT ");
     std::string_view separator;
-    for (const Column column : place.columns) {
-        find.add(separator).add(orderColumn(column));
+    for (const std::string_view column : columns) {
+        sql.add(separator).add(column);
         separator = ", ";
     }
-    find.add(" FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
-    find.bind(std::int64_t{order.number}).add(" AND place=");
-    find.bind(query.offset / kAnchorDistance).add(")");
-    const Result anchor = reader_.connection().run(find);
-    Sql sql = newSql("SELECT ").add(columnList(query.select, ""));
-    if (anchor.size() == 0) {
-        return sql.add(" FROM songs LIMIT 0");
+    sql.add(" FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
+    sql.bind(std::int64_t{order.number}).add(" AND place=");
+    sql.bind(query.offset / kAnchorDistance).add(")) SELECT ");
+    sql.add(columnList(query.select, "")).add(" FROM ");
+    if (leading.descending && columns.size() > 1) {
+        addStretch(sql.add("("), leading, true, kAnchorDistance + query.limit);
+        addStretch(sql.add(" UNION ALL "), leading, false, kAnchorDistance + query.limit);
+        sql.add(") AS songs ORDER BY stretch, ");
+    } else {
+        addComparison(sql.add("songs WHERE "), columns, leading.descending ? "<=" : ">=");
+        sql.add(" ORDER BY ");
     }
-    for (size_t i = 0; i < place.columns.size(); ++i) {
-        place.values.push_back(valueOf(anchor[0], static_cast<int>(i), place.columns[i]));
-    }
-    const std::int64_t skipped = query.offset % kAnchorDistance;
-    addStretch(sql.add(" FROM ("), place, true, skipped + query.limit);
-    addStretch(sql.add(" UNION ALL "), place, false, skipped + query.limit);
-    sql.add(") AS songs ORDER BY stretch, ").add(orderText(order.leading, ""));
-    sql.addPage(skipped, query.limit);
+    addLimit(sql.add(orderText(leading, "")).add(" OFFSET ").bind(skipped), query.limit);
     return sql;
 }
 
 Sql SongPlan::page(const Query &query) {
     const auto leading = leadingOf(query.order);
-    const StoredOrder *stored = leading && !query.random ? findStoredOrder(*leading) : nullptr;
-    if (stored != nullptr && conjuncts_.empty()) {
+    const StoredOrder *stored = leading ? findStoredOrder(*leading) : nullptr;
+    if (stored != nullptr) {
         if (auto deep = anchored(*stored, query)) {
             return std::move(*deep);
         }
@@ -166,7 +155,11 @@ Sql SongPlan::page(const Query &query) {
     } else {
         sql.addFullOrder(query.order, "songs.");
     }
-    sql.addPage(query.offset, query.limit);
+    if (isPlanKept(query)) {
+        addLimit(sql, query.limit);
+    } else {
+        sql.addPage(query.offset, query.limit);
+    }
     return sql;
 }
 

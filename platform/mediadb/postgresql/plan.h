@@ -26,6 +26,8 @@ class SongPlan {
     Sql distinctPage(const Query &query);
     std::int64_t count(std::optional<Column> distinct);
 
+    /* Whether one plan serves all pages of this kind: the server need not make it anew. */
+    bool isPlanKept(const Query &query) const;
     bool isUnconditional() const { return conjuncts_.empty(); }
     /* The values of a column, where they are kept and the query asks for nothing else. */
     std::optional<Sql> facetPage(const Query &query);

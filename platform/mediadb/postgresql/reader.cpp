@@ -11,8 +11,9 @@ namespace zano::mediadb::postgresql {
 namespace {
 
 constexpr size_t kMaxIdleReaders = 4;
-constexpr const char *kBegin =
-    "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ, READ ONLY; SELECT name, value FROM state";
+constexpr const char *kState = "SELECT name, value FROM state";
+constexpr std::string_view kBegin =
+    "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ, READ ONLY; EXECUTE ";
 
 }  // namespace
 
@@ -32,7 +33,7 @@ std::int64_t *State::find(std::string_view name) {
 void Reader::beginSnapshot() {
     State state;
     try {
-        const Result rows = connection_.run(std::string(kBegin));
+        const Result rows = connection_.run(std::string(kBegin) + connection_.nameOf(kState));
         for (int i = 0; i < rows.size(); ++i) {
             if (std::int64_t *value = state.find(rows[i].text(0))) {
                 *value = rows[i].integer(1);
@@ -56,7 +57,7 @@ void Reader::beginSnapshot() {
 
 bool Reader::endSnapshot() noexcept {
     try {
-        connection_.run(std::string("COMMIT"));
+        connection_.runLater("COMMIT");
         return true;
     } catch (const std::exception &) {
         return false;

@@ -2,6 +2,7 @@
  * docs/media-database.md describes them. */
 #pragma once
 
+#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -15,6 +16,12 @@ constexpr std::int64_t kSchemaVersion = 1;
 /* Connects to the primary. Missing tables are made and an older schema is migrated, by one program
  * while others wait; a schema of another program or a newer version is left as it is and throws. */
 Connection openForWriting(const std::string &uri);
+
+constexpr int kIndexSteps = 13;
+/* Makes those indexes of the songs that are missing, in a transaction. They wait for the end of a
+ * first scan, since keeping them up with every song costs several times as much. onStep is called
+ * so many times. */
+void addIndexes(Connection &connection, const std::function<void()> &onStep);
 
 /* Throws unless the version is the one that this program knows. */
 void requireVersion(std::int64_t version);

@@ -94,7 +94,7 @@ Sql SongArrays::withArrays(std::string_view before, std::string_view after) {
 Sql SongArrays::insertion() {
     std::string before = "INSERT INTO songs(";
     before.append(kColumns).append(") SELECT ").append(kColumns).append(" FROM ");
-    return withArrays(before, " ORDER BY place ON CONFLICT(path) DO NOTHING RETURNING path, id");
+    return withArrays(before, " ORDER BY place");
 }
 
 Sql SongArrays::replacement() {
@@ -108,8 +108,7 @@ Sql SongArrays::replacement() {
         " WHERE songs.id=new.id");
 }
 
-std::map<std::string, StoredSong> loadSongs(Connection &connection,
-                                            const std::vector<Song> &songs) {
+std::map<std::string, StoredSong> loadSongs(Connection &connection, std::span<const Song> songs) {
     ArrayText paths;
     for (const Song &song : songs) {
         paths.addPath(song.path);
@@ -117,7 +116,7 @@ std::map<std::string, StoredSong> loadSongs(Connection &connection,
     Sql sql = newSql(
         "SELECT id, path, title, album, artist, genre, track, disc, year, duration FROM songs "
         "WHERE path=ANY(");
-    sql.bind(paths.take()).add("::bytea[]) ORDER BY path FOR UPDATE");
+    sql.bind(paths.take()).add("::bytea[])");
     const Result rows = connection.run(sql);
     std::map<std::string, StoredSong> stored;
     for (int i = 0; i < rows.size(); ++i) {

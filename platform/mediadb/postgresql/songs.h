@@ -2,6 +2,7 @@
 #pragma once
 
 #include <map>
+#include <span>
 #include <string>
 #include <tuple>
 #include <vector>
@@ -38,7 +39,6 @@ class SongArrays {
     void add(const Song &song, std::int64_t id);
     bool isEmpty() const { return isEmpty_; }
 
-    /* Gives the paths and ids of the songs that no other program has inserted meanwhile. */
     Sql insertion();
     Sql replacement();
 
@@ -65,8 +65,8 @@ struct StoredSong {
     }
 };
 
-/* The stored rows of some paths, which are locked until the end of the batch. */
-std::map<std::string, StoredSong> loadSongs(Connection &connection, const std::vector<Song> &songs);
+/* The stored rows of some paths. */
+std::map<std::string, StoredSong> loadSongs(Connection &connection, std::span<const Song> songs);
 
 void countFacets(FacetChanges &changes, const std::string &artist, const std::string &album,
                  const std::string &genre, int by);
