@@ -1,4 +1,4 @@
-/* usage: library_bench CATALOGUE [Google Benchmark's options]
+/* usage: library_bench LOCATION [Google Benchmark's options]
  *
  * Asks the library what a web front asks, over a catalogue made by generate_catalogue, beside the
  * best statements that can be written by hand for the same rows, and prints the ratios. The setting
@@ -11,18 +11,15 @@
 #include <algorithm>
 #include <array>
 #include <cstdio>
-#include <functional>
-#include <optional>
+#include <memory>
 #include <random>
 
-#include "raw.h"
+#include "hand.h"
 #include "report.h"
 #include "root.h"
 
 namespace zano::bench {
 namespace {
-
-using Question = std::function<int()>;
 
 /* Every way to ask must give the same number of rows, or times mean nothing. */
 void add(const std::string &name, const Question &question, int rows) {
@@ -37,6 +34,13 @@ void add(const std::string &name, const Question &question, int rows) {
             }
         }
     });
+}
+
+void add(const std::string &name, const Question &library, const Ways &byHand, int rows) {
+    add(name + "/library", library, rows);
+    for (const Way &way : byHand) {
+        add(name + "/raw" + (way.name.empty() ? "" : " (" + way.name + ")"), way.ask, rows);
+    }
 }
 
 int released(ZANO_PLAYLIST_REC *list) {
@@ -58,262 +62,113 @@ int counted(const char *keyword) {
     return count;
 }
 
+int artists() {
+    ZANO_PLAYLIST_REC *values = nullptr;
+    ZANOMusicBrowse(0, &values, " artist as title ", nullptr, "artist", "lower(artist)", 0, 50);
+    return released(values);
+}
+
 struct Term {
     const char *text;
     const char *kind;
 };
 
-class Questions {
-  public:
-    explicit Questions(const std::string &path) : raw_(path) {}
+void addPages(Hand &hand, int songs) {
+    const int half = songs / 2;
+    const auto deep = [half] { return listed(nullptr, nullptr, true, half, 50); };
+    const auto byArtist = [](int offset) {
+        return [offset] { return listed(nullptr, "lower(artist)", false, offset, 50); };
+    };
+    add(
+        "first page", [] { return listed(nullptr, nullptr, true, 0, 50); }, hand.firstPage(), 50);
+    add("page at half depth", deep, hand.deepPage(half), 50);
+    add("page at half depth, against a place known beforehand", deep, hand.knownPage(half), 50);
+    const int last = songs - 50;
+    add(
+        "last page", [last] { return listed(nullptr, nullptr, true, last, 50); },
+        hand.deepPage(last), 50);
+    add("first page by artist, descending", byArtist(0), hand.firstPageByArtistDescending(), 50);
+    add("page at half depth by artist, descending", byArtist(half),
+        hand.deepPageByArtistDescending(half), 50);
+    add("page at half depth by artist, descending, against a place known beforehand",
+        byArtist(half), hand.knownPageByArtistDescending(half), 50);
+}
 
-    void addAll() {
-        songs_ = counted(nullptr);
-        addPages();
-        addSearches();
-        addOthers();
-    }
-
-  private:
-    int prepare(const std::string &sql) { return raw_.prepare(sql); }
-
-    void addPages() {
-        const std::string select = "SELECT " + Raw::kColumns + " FROM songs ";
-        const int first = prepare(select + "INDEXED BY songs_by_rank ORDER BY rank LIMIT 50");
+void addSearches(Hand &hand) {
+    static constexpr std::array kTerms = {
+        Term{"j", "none"},        Term{"jj", "none"},      Term{"jjj", "none"},
+        Term{"jjjjjjjj", "none"}, Term{"z", "few"},        Term{"zy", "few"},
+        Term{"zyz", "few"},       Term{"zyzzyvas", "few"}, Term{"q", "1 in 200"},
+        Term{"qu", "1 in 200"},   Term{"qui", "1 in 200"}, Term{"quixotic", "1 in 200"},
+        Term{"w", "half"},        Term{"wa", "half"},      Term{"wav", "half"},
+        Term{"wavelike", "half"}};
+    for (const Term &term : kTerms) {
+        const std::string what = std::string("\"") + term.text + "\" (" + term.kind + ")";
+        const int all = counted(term.text);
         add(
-            "first page/library", [] { return listed(nullptr, nullptr, true, 0, 50); }, 50);
+            "search " + what, [term] { return listed(term.text, nullptr, true, 0, 50); },
+            hand.search(term.text), std::min(50, all));
         add(
-            "first page/raw", [this, first] { return raw_.rows(first, {}, {}); }, 50);
-
-        const int half = songs_ / 2;
-        const int deep = prepare(select +
-                                 "INDEXED BY songs_by_rank WHERE rank>=?1 "
-                                 "ORDER BY rank LIMIT 50");
-        const long rank = raw_.number(
-            prepare("SELECT rank FROM songs ORDER BY rank LIMIT 1 OFFSET " + std::to_string(half)),
-            {});
-        add(
-            "page at half depth/library",
-            [half] { return listed(nullptr, nullptr, true, half, 50); }, 50);
-        const int byAnchor =
-            prepare(select +
-                    "INDEXED BY songs_by_rank WHERE rank>=(SELECT rank FROM songs WHERE id=(SELECT "
-                    "song FROM "
-                    "anchors WHERE stored_order=1 AND place=?1)) ORDER BY rank LIMIT 50 OFFSET ?2");
-        add(
-            "page at half depth/raw (by anchor)",
-            [this, byAnchor, half] {
-                return raw_.rows(byAnchor, {}, {half / 128, half % 128});
-            },
-            50);
-        add(
-            "page at half depth, against a place known beforehand/library",
-            [half] { return listed(nullptr, nullptr, true, half, 50); }, 50);
-        add(
-            "page at half depth, against a place known beforehand/raw",
-            [this, deep, rank] { return raw_.rows(deep, {}, {rank}); }, 50);
-
-        const int byArtist = prepare(select +
-                                     "INDEXED BY songs_by_artist_down "
-                                     "ORDER BY artist_key DESC, tail_rank_down DESC LIMIT 50");
-        add(
-            "first page by artist, descending/library",
-            [] { return listed(nullptr, "lower(artist)", false, 0, 50); }, 50);
-        add(
-            "first page by artist, descending/raw",
-            [this, byArtist] { return raw_.rows(byArtist, {}, {}); }, 50);
-        const int artistDeep =
-            prepare(select +
-                    "INDEXED BY songs_by_artist_down WHERE (artist_key, tail_rank_down)<="
-                    "(?1, ?2) ORDER BY artist_key DESC, tail_rank_down DESC LIMIT 50");
-        const int artistByAnchor = prepare(
-            select +
-            "INDEXED BY songs_by_artist_down WHERE (artist_key, tail_rank_down)<=(SELECT "
-            "artist_key, tail_rank_down FROM songs WHERE id=(SELECT song FROM anchors WHERE "
-            "stored_order=6 AND place=?1)) ORDER BY artist_key DESC, tail_rank_down DESC "
-            "LIMIT 50 OFFSET ?2");
-        add(
-            "page at half depth by artist, descending/library",
-            [half] { return listed(nullptr, "lower(artist)", false, half, 50); }, 50);
-        add(
-            "page at half depth by artist, descending/raw (by anchor)",
-            [this, artistByAnchor, half] {
-                return raw_.rows(artistByAnchor, {}, {half / 128, half % 128});
-            },
-            50);
-        const std::string at =
-            " FROM songs INDEXED BY songs_by_artist_down ORDER BY artist_key DESC, "
-            "tail_rank_down DESC LIMIT 1 OFFSET " +
-            std::to_string(half);
-        const std::string key = raw_.text(prepare("SELECT artist_key" + at));
-        const long tail = raw_.number(prepare("SELECT tail_rank_down" + at), {});
-        add(
-            "page at half depth by artist, descending, against a place known beforehand/library",
-            [half] { return listed(nullptr, "lower(artist)", false, half, 50); }, 50);
-        add(
-            "page at half depth by artist, descending, against a place known beforehand/raw (place "
-            "known)",
-            [this, artistDeep, key, tail] { return raw_.rows(artistDeep, {key}, {tail}); }, 50);
-    }
-
-    /* Three plans by hand: the search index in its own order, the search index and a sort, and
-     * the walk of the order with a filter. The fastest counts. */
-    void addSearches() {
-        static constexpr std::array kTerms = {
-            Term{"j", "none"},        Term{"jj", "none"},      Term{"jjj", "none"},
-            Term{"jjjjjjjj", "none"}, Term{"z", "few"},        Term{"zy", "few"},
-            Term{"zyz", "few"},       Term{"zyzzyvas", "few"}, Term{"q", "1 in 200"},
-            Term{"qu", "1 in 200"},   Term{"qui", "1 in 200"}, Term{"quixotic", "1 in 200"},
-            Term{"w", "half"},        Term{"wa", "half"},      Term{"wav", "half"},
-            Term{"wavelike", "half"}};
-        const std::string indexed = "SELECT " + Raw::kColumns +
-                                    " FROM grams CROSS JOIN songs ON songs.rank=grams.rowid WHERE "
-                                    "grams MATCH ?1 AND instr(title_key, ?2)>0 ORDER BY ";
-        const int stream = prepare(indexed + "grams.rowid LIMIT 50");
-        const int sort = prepare(indexed + "+songs.rank LIMIT 50");
-        const int walk =
-            prepare("SELECT " + Raw::kColumns +
-                    " FROM songs INDEXED BY songs_by_rank WHERE instr(title_key, ?1)>0 "
-                    "ORDER BY rank LIMIT 50");
-        const int countGrams = prepare("SELECT count(*) FROM grams WHERE grams MATCH ?1");
-        const int countJoin = prepare(
-            "SELECT count(*) FROM grams CROSS JOIN songs ON songs.rank=grams.rowid WHERE grams "
-            "MATCH ?1 AND instr(title_key, ?2)>0");
-        const int countScan = prepare("SELECT count(*) FROM songs WHERE instr(title_key, ?1)>0");
-        for (const Term &term : kTerms) {
-            const std::string text = term.text;
-            const std::string match = matchOf(text);
-            const int rows = std::min(50, counted(term.text));
-            const std::string page = "search \"" + text + "\" (" + term.kind + ")";
-            add(
-                page + "/library", [term] { return listed(term.text, nullptr, true, 0, 50); },
-                rows);
-            add(
-                page + "/raw stream",
-                [=, this] {
-                    return raw_.rows(stream, {match, text}, {});
-                },
-                rows);
-            add(
-                page + "/raw sort",
-                [=, this] {
-                    return raw_.rows(sort, {match, text}, {});
-                },
-                rows);
-            add(
-                page + "/raw walk", [=, this] { return raw_.rows(walk, {text}, {}); }, rows);
-
-            const int all = counted(term.text);
-            const std::string count = "count \"" + text + "\" (" + term.kind + ")";
-            add(
-                count + "/library", [term] { return counted(term.text); }, all);
-            if (text.size() <= 3) {
-                add(
-                    count + "/raw index",
-                    [=, this] { return static_cast<int>(raw_.number(countGrams, {match})); }, all);
-            }
-            add(
-                count + "/raw join",
-                [=, this] {
-                    return static_cast<int>(raw_.number(countJoin, {match, text}));
-                },
-                all);
-            add(
-                count + "/raw scan",
-                [=, this] { return static_cast<int>(raw_.number(countScan, {text})); }, all);
-        }
-    }
-
-    static std::string matchOf(const std::string &text) {
-        std::string match;
-        if (text.size() < 3) {
-            return match.append("\"\x01").append(text).append("\" *");
-        }
-        for (size_t i = 0; i + 3 <= text.size(); ++i) {
-            match.append(i == 0 ? "" : " AND ").append("\"\x01").append(text, i, 3).append("\"");
-        }
-        return match;
-    }
-
-    void addOthers() {
-        const int byId = prepare("SELECT " + Raw::kColumns + " FROM songs WHERE id=?1");
-        std::mt19937 random(1);
-        std::uniform_int_distribution<long> anyId(1, songs_);
-        std::vector<long> thousand;
-        for (int i = 0; i < 1000; ++i) {
-            thousand.push_back(anyId(random));
-        }
-        std::sort(thousand.begin(), thousand.end());
-        thousand.erase(std::unique(thousand.begin(), thousand.end()), thousand.end());
-        std::shuffle(thousand.begin(), thousand.end(), random);
-        std::string list;
-        for (const long id : thousand) {
-            list += (list.empty() ? "" : ",") + std::to_string(id);
-        }
-        const auto all = static_cast<int>(thousand.size());
-        add(
-            "random 100/library", [] { return listed(nullptr, "random", true, 0, 100); }, 100);
-        add(
-            "random 100/raw (100 by id)",
-            [this, byId, anyId, random]() mutable {
-                std::vector<long> hundred;
-                for (int i = 0; i < 100; ++i) {
-                    hundred.push_back(anyId(random));
-                }
-                return raw_.rowsById(byId, hundred);
-            },
-            100);
-        add(
-            "1000 by id/library",
-            [list] {
-                ZANO_PLAYLIST_REC *songs = nullptr;
-                ZANOMusicListGetByID(&songs, list.c_str());
-                return released(songs);
-            },
+            "count " + what, [term] { return counted(term.text); }, hand.countOfSearch(term.text),
             all);
-        add(
-            "1000 by id/raw", [=, this] { return raw_.rowsById(byId, thousand); }, all);
-
-        const int artists =
-            prepare("SELECT name FROM facets WHERE facet=1 ORDER BY key, name LIMIT 50");
-        const int artistCount = prepare("SELECT value FROM state WHERE name='artists'");
-        add(
-            "first page of artists, with total/library",
-            [] {
-                ZANO_PLAYLIST_REC *values = nullptr;
-                ZANOMusicBrowse(0, &values, " artist as title ", nullptr, "artist", "lower(artist)",
-                                0, 50);
-                return released(values);
-            },
-            50);
-        add(
-            "first page of artists, with total/raw",
-            [=, this] {
-                raw_.number(artistCount, {});
-                return raw_.values(artists);
-            },
-            50);
-        const int total = prepare("SELECT value FROM state WHERE name='songs'");
-        add(
-            "count of all/library", [] { return counted(nullptr); }, songs_);
-        add(
-            "count of all/raw", [=, this] { return static_cast<int>(raw_.number(total, {})); },
-            songs_);
     }
+}
 
-    Raw raw_;
-    int songs_ = 0;
-};
+void addOthers(Hand &hand, int songs) {
+    std::mt19937 random(1);
+    std::uniform_int_distribution<long> anyId(1, songs);
+    std::vector<long> thousand;
+    for (int i = 0; i < 1000; ++i) {
+        thousand.push_back(anyId(random));
+    }
+    std::sort(thousand.begin(), thousand.end());
+    thousand.erase(std::unique(thousand.begin(), thousand.end()), thousand.end());
+    std::shuffle(thousand.begin(), thousand.end(), random);
+    std::string list;
+    for (const long id : thousand) {
+        list += (list.empty() ? "" : ",") + std::to_string(id);
+    }
+    add(
+        "random 100", [] { return listed(nullptr, "random", true, 0, 100); },
+        hand.hundredById(songs), 100);
+    add(
+        "1000 by id",
+        [list] {
+            ZANO_PLAYLIST_REC *rows = nullptr;
+            ZANOMusicListGetByID(&rows, list.c_str());
+            return released(rows);
+        },
+        hand.byIds(thousand), static_cast<int>(thousand.size()));
+    add("first page of artists", artists, hand.artists(), 50);
+    add(
+        "first page of artists, with total",
+        [] {
+            return MediaInfoDBGetCount(0, "DISTINCT artist", nullptr, 0, 0) > 0 ? artists() : -1;
+        },
+        hand.artistsWithTotal(), 50);
+    add(
+        "count of all", [] { return counted(nullptr); }, hand.countOfAll(), songs);
+}
+
+std::unique_ptr<Hand> handOf(const std::string &location) {
+    constexpr std::string_view kSqlite = "sqlite:";
+    return location.compare(0, kSqlite.size(), kSqlite) == 0
+               ? sqliteHand(location.substr(kSqlite.size()))
+               : postgresqlHand(location);
+}
 
 }  // namespace
 }  // namespace zano::bench
 
 int main(int argc, char **argv) {
-    std::optional<zano::bench::Questions> questions;
+    std::unique_ptr<zano::bench::Hand> hand;
     return zano::bench::runComparison(argc, argv, "library_bench",
-                                      [&questions](const std::string &catalogue) {
-                                          zano::bench::prepareRoot(catalogue);
-                                          questions.emplace(catalogue);
-                                          questions->addAll();
+                                      [&hand](const std::string &location) {
+                                          zano::bench::prepareRoot(location);
+                                          hand = zano::bench::handOf(location);
+                                          const int songs = zano::bench::counted(nullptr);
+                                          zano::bench::addPages(*hand, songs);
+                                          zano::bench::addSearches(*hand);
+                                          zano::bench::addOthers(*hand, songs);
                                       });
 }

@@ -64,9 +64,9 @@ void RatioReporter::Finalize() {
 }
 
 int runComparison(int argc, char **argv, const char *name,
-                  const std::function<void(const std::string &catalogue)> &add) {
+                  const std::function<void(const std::string &location)> &add) {
     if (argc < 2 || argv[1][0] == '-') {
-        std::fprintf(stderr, "usage: %s CATALOGUE [options of Google Benchmark]\n", name);
+        std::fprintf(stderr, "usage: %s LOCATION [options of Google Benchmark]\n", name);
         return 2;
     }
     try {

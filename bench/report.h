@@ -30,6 +30,6 @@ class RatioReporter : public benchmark::BenchmarkReporter {
 /* The main function of a program "NAME CATALOGUE [Google Benchmark's options]": add(catalogue)
  * registers the benchmarks, which then run and are reported. The exit status. */
 int runComparison(int argc, char **argv, const char *name,
-                  const std::function<void(const std::string &catalogue)> &add);
+                  const std::function<void(const std::string &location)> &add);
 
 }  // namespace zano::bench

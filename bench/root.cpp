@@ -7,11 +7,11 @@
 
 namespace zano::bench {
 
-std::string prepareRoot(const std::string &catalogue) {
+std::string prepareRoot(const std::string &location) {
     namespace fs = std::filesystem;
     fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
     fs::create_directories(fs::path(ZANO_PATH_MUSIC_LINK).parent_path());
-    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"sqlite:" << catalogue << "\"\n";
+    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << location << "\"\n";
     fs::remove(ZANO_PATH_MUSIC_LINK);
     fs::create_symlink("/volume1/music", ZANO_PATH_MUSIC_LINK);
     return ZANO_ROOT;

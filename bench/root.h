@@ -5,8 +5,8 @@
 
 namespace zano::bench {
 
-/* Writes the settings that name this catalogue, and the music link, below the build's own root;
- * returns the root. */
-std::string prepareRoot(const std::string &catalogue);
+/* Writes the settings that name the catalogue at this location, and the music link, below the
+ * build's own root; returns the root. */
+std::string prepareRoot(const std::string &location);
 
 }  // namespace zano::bench
