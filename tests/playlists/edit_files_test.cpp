@@ -6,6 +6,7 @@
 #include <array>
 #include <string>
 
+#include "platform/mediadb/cluster.h"
 #include "support/files.h"
 #include "system_paths_internal.h"
 
@@ -15,7 +16,8 @@ class EditFiles : public testing::Test, protected files::Folder {
   protected:
     EditFiles() {
         std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
-        files::write(ZANO_PATH_CONF, "mediadb=\"sqlite:" + path("media.db") + "\"\n");
+        files::write(ZANO_PATH_CONF,
+                     "mediadb=\"" + zano::mediadb::locationForTest(path("media.db")) + "\"\n");
     }
     ~EditFiles() override { std::filesystem::remove(ZANO_PATH_CONF); }
 };

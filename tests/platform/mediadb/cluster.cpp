@@ -5,6 +5,7 @@
 #include <pwd.h>
 #include <signal.h>
 #include <sys/prctl.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -14,6 +15,7 @@
 #include <filesystem>
 #include <memory>
 #include <stdexcept>
+#include <utility>
 #include <vector>
 
 namespace zano::mediadb {
@@ -59,18 +61,32 @@ bool succeeds(pid_t child) {
     return waitpid(child, &status, 0) == child && WIFEXITED(status) && WEXITSTATUS(status) == 0;
 }
 
-/* The life of the guard: says "+" when the data are there, and waits for the lifeline's end. */
-int guardServer(const std::string &folder, int lifeline, int report) {
+/* The life of the guard: says "+" when the data are there, and waits for the lifeline's end. The
+ * data are those of the server in the folder `primary`, or new where that is empty. */
+int guardServer(const std::string &folder, const std::string &primary, int lifeline, int report) {
     signal(SIGINT, SIG_IGN);  // ended by the lifeline alone
     const passwd *user = geteuid() == 0 ? getpwnam("nobody") : nullptr;
     const std::string log = folder + "/log";
     const std::string programs = kPrograms;
     const std::string data = folder + "/data";
     bool isMade = user == nullptr || chown(folder.c_str(), user->pw_uid, user->pw_gid) == 0;
-    isMade =
-        isMade && succeeds(start(user, log,
-                                 {programs + "/initdb", "-D", data, "-U", kOwner, "-A", "trust",
-                                  "--encoding=UTF8", "--locale=C.UTF-8", "--no-sync"}));
+    const std::vector<std::string> make = {
+        programs + "/initdb", "-D",       data, "-U", kOwner, "-A", "trust", "--encoding=UTF8",
+        "--locale=C.UTF-8",   "--no-sync"};
+    const std::vector<std::string> copy = {programs + "/pg_basebackup",
+                                           "-D",
+                                           data,
+                                           "-U",
+                                           kOwner,
+                                           "-h",
+                                           primary,
+                                           "-R",
+                                           "-X",
+                                           "stream",
+                                           "-c",
+                                           "fast",
+                                           "--no-sync"};
+    isMade = isMade && succeeds(start(user, log, primary.empty() ? make : copy));
     pid_t server = -1;
     if (isMade) {
         server = start(user, log,
@@ -83,12 +99,21 @@ int guardServer(const std::string &folder, int lifeline, int report) {
     while (isReported && read(lifeline, &none, 1) > 0) {
     }
     if (server > 0) {
-        kill(server, SIGQUIT);
+        ::kill(server, SIGQUIT);
         waitpid(server, nullptr, 0);
     }
     std::error_code error;
     std::filesystem::remove_all(folder, error);
     return 0;
+}
+
+/* The ends of other lifelines too, which would not end while this process has them. */
+void closeAllBut(int one, int other) {
+    for (int descriptor = 3; descriptor < 1024; ++descriptor) {
+        if (descriptor != one && descriptor != other) {
+            close(descriptor);
+        }
+    }
 }
 
 using Server = std::unique_ptr<PGconn, decltype(&PQfinish)>;
@@ -104,10 +129,12 @@ Cluster &Cluster::get() {
     return cluster;
 }
 
-Cluster::Cluster() {
+Cluster::Cluster(const Cluster *primary) {
     std::string pattern = (std::filesystem::temp_directory_path() / "zano-pg-XXXXXX").string();
     require(mkdtemp(pattern.data()) != nullptr, "no folder");
     folder_ = pattern;
+    /* A test may give up what lets root enter folders of others. */
+    require(chmod(pattern.data(), 0711) == 0, "chmod");
     std::array<int, 2> lifeline{};
     std::array<int, 2> report{};
     require(pipe2(lifeline.data(), O_CLOEXEC) == 0 && pipe2(report.data(), O_CLOEXEC) == 0, "pipe");
@@ -115,9 +142,9 @@ Cluster::Cluster() {
     require(guard_ >= 0, "fork");
     if (guard_ == 0) {
         setsid();
-        close(lifeline[1]);
-        close(report[0]);
-        _exit(guardServer(folder_, lifeline[0], report[1]));
+        closeAllBut(lifeline[0], report[1]);
+        _exit(guardServer(folder_, primary != nullptr ? primary->folder_ : "", lifeline[0],
+                          report[1]));
     }
     close(lifeline[0]);
     close(report[1]);
@@ -135,8 +162,14 @@ Cluster::Cluster() {
 }
 
 Cluster::~Cluster() {
-    close(lifeline_);
-    waitpid(guard_, nullptr, 0);
+    kill();
+}
+
+void Cluster::kill() {
+    if (lifeline_ >= 0) {
+        close(std::exchange(lifeline_, -1));
+        waitpid(guard_, nullptr, 0);
+    }
 }
 
 std::string Cluster::address(const std::string &database, const std::string &role) const {
@@ -145,6 +178,11 @@ std::string Cluster::address(const std::string &database, const std::string &rol
         host += c == '/' ? "%2F" : std::string(1, c);
     }
     return "postgresql://" + role + "@/" + database + "?host=" + host;
+}
+
+std::string Cluster::addressWith(const Cluster &other, const std::string &database) const {
+    const std::string there = other.address("", "");
+    return address(database, kOwner) + "," + there.substr(there.rfind('=') + 1);
 }
 
 std::string Cluster::newDatabase() {
@@ -164,6 +202,11 @@ std::string Cluster::run(const std::string &address, const std::string &sql) {
     PQclear(result);
     require(isDone, sql + ": " + words + PQerrorMessage(server.get()));
     return value;
+}
+
+std::string locationForTest(const std::string &file) {
+    return std::getenv("ZANO_TEST_ON_POSTGRESQL") != nullptr ? Cluster::get().newDatabase()
+                                                             : "sqlite:" + file;
 }
 
 void Cluster::endConnections() {

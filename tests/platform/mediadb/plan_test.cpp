@@ -1,14 +1,16 @@
-/* How SQLite goes about the statements of the listings: no page sorts the songs. */
-#include "mediadb/sqlite/plan.h"
+/* How the engines go about the statements of the listings: no page sorts the songs. */
+#include "mediadb/postgresql/plan.h"
+#include "cluster.h"
 #include "fixture.h"
 #include "mediadb/query/parse.h"
+#include "mediadb/sqlite/plan.h"
 
-namespace zano::mediadb::sqlite {
+namespace zano::mediadb {
 namespace {
 
-class PlanTest : public MediaDatabaseTest {
+class AnyPlanTest : public MediaDatabaseTest {
   protected:
-    PlanTest() {
+    explicit AnyPlanTest(const std::string &place = "") : MediaDatabaseTest(place) {
         auto catalogue = openCatalogue(location());
         std::vector<Song> songs;
         for (int i = 0; i < 3000; ++i) {
@@ -18,8 +20,33 @@ class PlanTest : public MediaDatabaseTest {
             songs.push_back(made);
         }
         put(*catalogue, songs);
-        pool_ = std::make_shared<ReaderPool>(databasePath());
     }
+
+    static const std::vector<std::string> &orders() {
+        static const std::vector<std::string> all = [] {
+            std::vector<std::string> made;
+            const std::string tail =
+                ", album, disc, track, title, artist, genre, year, path, duration";
+            for (const char *leading :
+                 {"lower(title)", "lower(artist)", "lower(album)", "lower(genre)", "year",
+                  "duration", "path", "id", "title", "artist"}) {
+                made.push_back(leading + (" " + tail));
+                made.push_back(leading + (" desc" + tail));
+            }
+            return made;
+        }();
+        return all;
+    }
+};
+
+}  // namespace
+
+namespace sqlite {
+namespace {
+
+class PlanTest : public AnyPlanTest {
+  protected:
+    PlanTest() : pool_(std::make_shared<ReaderPool>(databasePath())) {}
 
     std::string planOf(const char *condition, const std::string &order, Query query) {
         auto reader = pool_->lease();
@@ -42,20 +69,6 @@ class PlanTest : public MediaDatabaseTest {
 
     std::shared_ptr<ReaderPool> pool_;
 };
-
-const std::vector<std::string> &orders() {
-    static const std::vector<std::string> all = [] {
-        std::vector<std::string> made;
-        const std::string tail = ", album, disc, track, title, artist, genre, year, path, duration";
-        for (const char *leading : {"lower(title)", "lower(artist)", "lower(album)", "lower(genre)",
-                                    "year", "duration", "path", "id", "title", "artist"}) {
-            made.push_back(leading + (" " + tail));
-            made.push_back(leading + (" desc" + tail));
-        }
-        return made;
-    }();
-    return all;
-}
 
 TEST_F(PlanTest, APageComesFromAnIndexAtAnyDepth) {
     for (const std::string &order : orders()) {
@@ -92,4 +105,65 @@ TEST_F(PlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
 }
 
 }  // namespace
-}  // namespace zano::mediadb::sqlite
+}  // namespace sqlite
+
+namespace postgresql {
+namespace {
+
+class PostgresqlPlanTest : public AnyPlanTest {
+  protected:
+    PostgresqlPlanTest()
+        : AnyPlanTest(Cluster::get().newDatabase()),
+          pool_(std::make_shared<ReaderPool>(location())) {}
+
+    std::string planOf(const char *condition, const std::string &order, Query query) {
+        auto reader = pool_->lease();
+        auto parsed = parseCondition(Table::Songs, condition);
+        query.select = parseSelect(Table::Songs, "*");
+        parseOrder(order.c_str(), query);
+        Sql explain = newSql("EXPLAIN ");
+        explain.append(SongPlan(*reader, parsed).page(query));
+        const Result rows = (*reader).connection().run(explain);
+        std::string plan;
+        for (int i = 0; i < rows.size(); ++i) {
+            plan.append(rows[i].text(0)).append("\n");
+        }
+        return plan;
+    }
+
+    std::shared_ptr<ReaderPool> pool_;
+};
+
+/* What is equal by the columns of an index is sorted as it comes, and of a descending order that
+ * begins at an anchor, two stretches of a page. */
+TEST_F(PostgresqlPlanTest, APageComesFromAnIndexAtAnyDepth) {
+    for (const std::string &order : orders()) {
+        for (const int offset : {0, 1500, 2999}) {
+            Query query;
+            query.limit = 50;
+            query.offset = offset;
+            const std::string plan = planOf("path like '/music/%'", order, query);
+            EXPECT_EQ(plan.find("Seq Scan on songs"), std::string::npos) << order << "\n" << plan;
+            EXPECT_NE(plan.find(" using songs_"), std::string::npos) << order << "\n" << plan;
+            const bool isSorted = plan.find("->  Sort") != std::string::npos;
+            EXPECT_TRUE(!isSorted || plan.find("Append") != std::string::npos) << order << "\n"
+                                                                               << plan;
+        }
+    }
+}
+
+TEST_F(PostgresqlPlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
+    for (const std::string &order : orders()) {
+        Query query;
+        query.limit = 50;
+        const std::string rare = planOf("title ilike '%title 1234%'", order, query);
+        EXPECT_NE(rare.find("Bitmap Index Scan on songs_grams"), std::string::npos) << order << "\n"
+                                                                                    << rare;
+        const std::string common = planOf("title ilike '%title%'", order, query);
+        EXPECT_NE(common.find(" using songs_"), std::string::npos) << order << "\n" << common;
+    }
+}
+
+}  // namespace
+}  // namespace postgresql
+}  // namespace zano::mediadb

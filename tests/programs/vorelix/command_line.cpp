@@ -13,6 +13,7 @@
 #include <iterator>
 #include <sstream>
 
+#include "platform/mediadb/cluster.h"
 #include "system_paths_internal.h"
 
 namespace command_line {
@@ -150,7 +151,8 @@ CommandLine::CommandLine() {
     folder_ = mkdtemp(name.data());
     database_ = folder_ / "media.db";
     fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
-    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"sqlite:" << database_.string() << "\"\n";
+    location_ = zano::mediadb::locationForTest(database_);
+    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << location_ << "\"\n";
 }
 
 CommandLine::~CommandLine() {
@@ -160,7 +162,7 @@ CommandLine::~CommandLine() {
 }
 
 void CommandLine::fill(const std::vector<zano::mediadb::Song> &songs) const {
-    const auto catalogue = zano::mediadb::openCatalogue("sqlite:" + database_.string());
+    const auto catalogue = zano::mediadb::openCatalogue(location_);
     catalogue->begin();
     for (const auto &song : songs) {
         catalogue->putSong(song);

@@ -56,7 +56,8 @@ class CommandLine : public testing::Test {
     static Json::Value answerOf(std::vector<std::string> arguments);
 
     std::filesystem::path folder_;
-    std::filesystem::path database_;
+    std::filesystem::path database_;  // a file of SQLite
+    std::string location_;
 };
 
 }  // namespace command_line

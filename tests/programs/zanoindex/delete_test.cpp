@@ -18,11 +18,11 @@ class DeleteTest : public IndexTest {
         ASSERT_EQ(run({music()}).status, 0);
         ZANO_MEDIA_INFO list = {};
         list_.copy(list.path, list_.size());
-        mediadb::sqlite::makeEngine(databaseFile())->savePlaylist(list);
+        this->engine()->savePlaylist(list);
     }
 
     std::size_t playlists() const {
-        const auto engine = mediadb::sqlite::makeEngine(databaseFile());
+        const auto engine = this->engine();
         return static_cast<std::size_t>(engine->count({mediadb::Table::Playlists, {}, {}}));
     }
 

@@ -20,7 +20,7 @@
 #include <linux/capability.h>
 
 #include "mediadb/query/parse.h"
-#include "mediadb/sqlite/engine.h"
+#include "platform/mediadb/cluster.h"
 
 namespace zano::index {
 namespace {
@@ -149,6 +149,7 @@ IndexTest::IndexTest() {
     std::string pattern = (fs::temp_directory_path() / "zanoindex-XXXXXX").string();
     folder_ = fs::canonical(mkdtemp(pattern.data()));
     fs::create_directory(music());
+    location_ = mediadb::locationForTest(databaseFile());
 }
 
 IndexTest::~IndexTest() {
@@ -213,7 +214,7 @@ std::string IndexTest::nameOf(const ZANO_MEDIA_INFO &row) const {
 std::vector<std::string> IndexTest::rows(
     const std::function<std::string(const ZANO_MEDIA_INFO &)> &toLine, const char *select,
     mediadb::Table table) const {
-    const auto engine = mediadb::sqlite::makeEngine(databaseFile());
+    const auto engine = this->engine();
     mediadb::Query query;
     query.table = table;
     query.select = mediadb::parseSelect(table, select);

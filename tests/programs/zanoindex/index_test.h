@@ -7,10 +7,12 @@
 #include <vorelix/records.h>
 #include <filesystem>
 #include <functional>
+#include <memory>
 #include <string>
 #include <vector>
 
 #include "mediadb/catalogue.h"
+#include "mediadb/engine.h"
 #include "mediadb/query/columns.h"
 
 namespace zano::index {
@@ -67,7 +69,8 @@ class IndexTest : public testing::Test {
 
     std::string music() const { return folder_ / "music"; }
     fs::path databaseFile() const { return folder_ / "media.db"; }
-    std::string location() const { return "sqlite:" + databaseFile().string(); }
+    const std::string &location() const { return location_; }
+    std::unique_ptr<mediadb::Engine> engine() const { return mediadb::makeEngine(location()); }
 
     /* The arguments with the database's in front. */
     std::vector<std::string> argumentsOf(const std::vector<std::string> &arguments) const;
@@ -94,6 +97,8 @@ class IndexTest : public testing::Test {
                                   const char *select = nullptr,
                                   mediadb::Table table = mediadb::Table::Songs) const;
     std::string nameOf(const ZANO_MEDIA_INFO &row) const;
+
+    std::string location_;
 };
 
 /* "added 1, updated 0, unchanged 3, removed 0, kept 0, failed 0" */

@@ -2,7 +2,6 @@
 #include <algorithm>
 
 #include "index_test.h"
-#include "mediadb/sqlite/engine.h"
 
 namespace zano::index {
 namespace {
@@ -283,7 +282,7 @@ TEST_F(ScanTest, Notices) {
     const auto fresh = add("new.ogg", "ogg");
     fs::rename(other, moved);
     fs::remove(song);
-    const auto engine = mediadb::sqlite::makeEngine(databaseFile());
+    const auto engine = this->engine();
     engine->addNotice({0, "/lists/a.m3u", "", 1});
     engine->addNotice({0, fresh, "", 1});
     engine->addNotice({0, song, "", 5});  // gone, but nobody said so
@@ -337,6 +336,23 @@ TEST_F(ScanTest, DatabaseThatCannotBeUsed) {
         Process(ZANOINDEX_PROGRAM, {"zanoindex", "--database", "x:y", music()}).wait();
     EXPECT_EQ(other.status, 1);
     EXPECT_NE(other.err, "");
+}
+
+TEST_F(ScanTest, SeveralAtOnce) {
+    for (const char *folder : {"a", "b", "c"}) {
+        addMany(folder, 30);
+    }
+    std::vector<std::unique_ptr<Process>> programs;
+    for (const char *folder : {"/a", "/b", "/c", "", ""}) {
+        programs.push_back(
+            std::make_unique<Process>(ZANOINDEX_PROGRAM, argumentsOf({music() + folder})));
+    }
+    for (const auto &program : programs) {
+        const auto ended = program->wait();
+        EXPECT_EQ(ended.status, 0) << ended.err;
+    }
+    EXPECT_EQ(paths().size(), 90U);
+    EXPECT_NO_THROW(mediadb::openCatalogue(location())->check());
 }
 
 TEST_F(ScanTest, OutputThatCannotBeWritten) {
