@@ -132,11 +132,13 @@ class PostgresqlCatalogue : public Catalogue {
     }
 
     bool removePlaylist(const std::string &path) override {
+        lockWriting();
         Sql sql = newSql("DELETE FROM playlists WHERE path=");
         return connection_.run(sql.bind(path).add(" RETURNING id")).size() > 0;
     }
 
     void addPlaylist(const PlaylistFile &playlist) override {
+        lockWriting();
         Sql sql = newSql(
             "INSERT INTO playlists(path, title, album, title_key, album_key, path_key) VALUES(");
         std::string_view separator;
