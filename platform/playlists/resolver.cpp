@@ -229,9 +229,7 @@ void Resolver::lookUp(std::span<const Wanted> wanted) {
     }
 }
 
-/* The rows come into the nodes that become the list: a copy of 7 KB each would cost as much as
- * reading them. */
-void Resolver::lookUpBatch(std::span<const Wanted *const> batch) {
+std::string Resolver::conditionOf(std::span<const Wanted *const> batch) {
     std::string condition = "path in (";
     for (std::size_t i = 0; i < batch.size(); ++i) {
         if (i == 0 || batch[i]->path != batch[i - 1]->path) {
@@ -240,6 +238,13 @@ void Resolver::lookUpBatch(std::span<const Wanted *const> batch) {
         }
     }
     condition.push_back(')');
+    return condition;
+}
+
+/* The rows come into the nodes that become the list: a copy of 7 KB each would cost as much as
+ * reading them. */
+void Resolver::lookUpBatch(std::span<const Wanted *const> batch) {
+    const std::string condition = conditionOf(batch);
     /* A limit, though it is never reached: without one the rows would be counted first. */
     const QueryResult result(MediaInfoDBOpen(MEDIA_TABLE_SONGS, fields_.select().c_str(),
                                              condition.c_str(), nullptr, "path", 0,

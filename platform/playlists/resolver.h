@@ -69,6 +69,7 @@ class Resolver {
     std::vector<std::uint32_t> entriesToSearch();
 
     void lookUp(std::span<const Wanted> wanted);
+    static std::string conditionOf(std::span<const Wanted *const> batch);
     void lookUpBatch(std::span<const Wanted *const> batch);
     void assign(const Wanted &wanted, RecordList row);
 
