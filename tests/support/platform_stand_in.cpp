@@ -117,27 +117,17 @@ std::string bytes(const ZANO_MEDIA_INFO &row) {
     return {reinterpret_cast<const char *>(&row), sizeof row};
 }
 
-List::~List() {
-    ZANOPlaylistRecFree(head_);
-}
-
-std::string List::text() const {
+std::string textOf(const ZANO_PLAYLIST_REC *list) {
     std::string text;
-    for (const ZANO_PLAYLIST_REC *node = head_; node != nullptr; node = node->next) {
+    for (const ZANO_PLAYLIST_REC *node = list; node != nullptr; node = node->next) {
         text += (text.empty() ? "" : ", ") + std::to_string(node->info.id) + " " + node->info.title;
     }
     return text;
 }
 
-Playlists::~Playlists() {
-    while (head_ != nullptr) {
-        std::free(std::exchange(head_, head_->next));
-    }
-}
-
-std::string Playlists::text() const {
+std::string textOf(const ZANO_PLAYLIST *list) {
     std::string text;
-    for (const ZANO_PLAYLIST *node = head_; node != nullptr; node = node->next) {
+    for (const ZANO_PLAYLIST *node = list; node != nullptr; node = node->next) {
         text += std::to_string(node->id) + " " + node->title + " " + node->album + " " +
                 node->path + "\n";
     }

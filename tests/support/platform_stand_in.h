@@ -16,7 +16,9 @@
 #include <gtest/gtest.h>
 #include <vorelix/records.h>
 
+#include <cstdlib>
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace stand_in {
@@ -64,35 +66,31 @@ ZANO_MEDIA_INFO row(int id, const std::string &title);
 /* All of a row, to compare. */
 std::string bytes(const ZANO_MEDIA_INFO &row);
 
-/* A list head that releases its list; text() is "id title, id title". */
-class List {
+/* "id title, id title" of songs; "id title album path", a line for each, of playlists. */
+std::string textOf(const ZANO_PLAYLIST_REC *list);
+std::string textOf(const ZANO_PLAYLIST *list);
+
+/* A list head that releases its list. */
+template <typename Node>
+class ListOf {
   public:
-    List() = default;
-    ~List();
-    List(const List &) = delete;
-    List &operator=(const List &) = delete;
-    ZANO_PLAYLIST_REC **address() { return &head_; }
-    const ZANO_PLAYLIST_REC *head() const { return head_; }
-    std::string text() const;
+    ListOf() = default;
+    ~ListOf() {
+        while (head_ != nullptr) {
+            std::free(std::exchange(head_, head_->next));
+        }
+    }
+    ListOf(const ListOf &) = delete;
+    ListOf &operator=(const ListOf &) = delete;
+    Node **address() { return &head_; }
+    Node *head() const { return head_; }
+    std::string text() const { return textOf(head_); }
 
   private:
-    ZANO_PLAYLIST_REC *head_ = nullptr;
+    Node *head_ = nullptr;
 };
-
-/* The same for playlists; text() is "id title album path", a line for each. */
-class Playlists {
-  public:
-    Playlists() = default;
-    ~Playlists();
-    Playlists(const Playlists &) = delete;
-    Playlists &operator=(const Playlists &) = delete;
-    ZANO_PLAYLIST **address() { return &head_; }
-    ZANO_PLAYLIST *head() { return head_; }
-    std::string text() const;
-
-  private:
-    ZANO_PLAYLIST *head_ = nullptr;
-};
+using List = ListOf<ZANO_PLAYLIST_REC>;
+using Playlists = ListOf<ZANO_PLAYLIST>;
 
 /* Starts from a new script; at the end no result may be open. */
 class Test : public testing::Test {
