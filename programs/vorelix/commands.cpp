@@ -1,6 +1,7 @@
 #include "commands.h"
 
 #include "state_options.h"
+#include "upnp_options.h"
 
 namespace vorelix {
 
@@ -69,6 +70,15 @@ const std::vector<Command> &allCommands() {
         {"ipod track", "Show all that is known of a track", 0, ipodTrackCommand, addTrackNumber},
         {"ipod playlists", "List its playlists", 0, ipodPlaylistsCommand},
         {"ipod songs", "List the tracks of a playlist", kPaging, ipodSongsCommand, addIPodPlaylist},
+        {"upnp", "Browse the media servers of the network", 0, nullptr},
+        {"upnp servers", "List the media servers of the network", 0, upnpServersCommand,
+         addNetwork},
+        {"upnp browse", "List what a container of a media server holds", kPaging, upnpBrowseCommand,
+         addMediaContainer},
+        {"upnp caps", "Show what a media server can search and sort by", 0, upnpCapsCommand,
+         addMediaServer},
+        {"upnp tree", "Show the containers of a media server with all that is below them", 0,
+         upnpTreeCommand, addMediaTree},
     };
     return commands;
 }

@@ -81,5 +81,18 @@ Outcome ipodTracksCommand(const Request &request, const Terminal &terminal);
 Outcome ipodTrackCommand(const Request &request, const Terminal &terminal);
 Outcome ipodPlaylistsCommand(const Request &request, const Terminal &terminal);
 Outcome ipodSongsCommand(const Request &request, const Terminal &terminal);
+/* Of media servers:
+ *   servers   {"servers": [{"name", "model", "id", "controlUrl", "url"}], "failed": [{"url",
+ *             "complaint"}]}, which are a complaint too
+ *   browse    {"server": {"name", "controlUrl"}, "id", "objects": [...], "lost", "repaired",
+ *             "offset", "limit", "total"}
+ *   caps      {"server", "search": [...], "sort": [...], "updateId"}
+ *   tree      {"server", "id", "objects": [...], "lost"}, each with its "depth", from 1
+ * An object has "kind" ("container" or "item"), "id", "title", "values", which has every value that
+ * the server gave, and "resources", with the address of each under "res". */
+Outcome upnpServersCommand(const Request &request, const Terminal &terminal);
+Outcome upnpBrowseCommand(const Request &request, const Terminal &terminal);
+Outcome upnpCapsCommand(const Request &request, const Terminal &terminal);
+Outcome upnpTreeCommand(const Request &request, const Terminal &terminal);
 
 }  // namespace vorelix

@@ -128,11 +128,20 @@ void resolvePaging(const Paging &paging, Request &request) {
     span.offset = static_cast<int>(offset);
 }
 
+/* Who asks for everything asks for no page. */
+void excludePages(CLI::App &app, CLI::Option &all) {
+    for (const char *other : {"--page", "--page-size", "--offset", "--limit"}) {
+        all.excludes(app.get_option(other));
+    }
+}
+
 /* The parser of the whole line. Every command writes into the same request, since only one of
  * them is given. */
 struct Parser {
-    CLI::App app{"Lists, searches and browses the music that zanoindex found; makes playlists.",
-                 "vorelix"};
+    CLI::App app{
+        "Lists, searches and browses the music that zanoindex found; makes playlists; browses "
+        "media servers.",
+        "vorelix"};
     Request request;
     Paging paging;
 
@@ -166,6 +175,9 @@ struct Parser {
             addPaging(sub, command.arguments, request, paging);
             addPlaylistArguments(sub, command.arguments, request.playlist);
             addUsersArguments(sub, command.arguments, request.users);
+            if (CLI::Option *all = sub.get_option_no_throw("--all")) {
+                excludePages(sub, *all);
+            }
             sub.footer("Also --json and --verbose: see vorelix --help");
             sub.callback([this, &command] { request.command = &command; });
         }

@@ -93,6 +93,17 @@ struct StateRequest {
     std::optional<std::string> title;
 };
 
+/* What commands that ask media servers were given. */
+struct UpnpRequest {
+    std::string server;        // its name, id or address
+    std::string object = "0";  // id of a container
+    bool all = false;
+    int depth = 3;
+    int waitSeconds = 2;
+    int timeoutSeconds = 10;
+    std::string interface;  // name or address; "": as the system chooses
+};
+
 struct Request {
     const Command *command = nullptr;
     std::vector<std::string> words;  // the whole command line as it was typed
@@ -107,6 +118,7 @@ struct Request {
     PlaylistRequest playlist;
     UsersRequest users;
     StateRequest state;
+    UpnpRequest upnp;
 };
 
 }  // namespace vorelix

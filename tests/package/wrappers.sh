@@ -32,5 +32,6 @@ check 'gpod/.*' 'programs/zanoipod/ipod\.cpp:'
 check 'utf8proc\.h' 'platform/text/|programs/playlists/text\.cpp:'
 check '(postgresql/)?libpq(-fe|/.*)?\.h' 'platform/mediadb/postgresql/'
 check 'curl/.*' 'upnp/'
-check 'libxml/.*' 'upnp/'
+check 'libxml/.*' 'upnp/|programs/upnp/'
+check 'miniupnpc/.*' 'programs/upnp/'
 exit $status
