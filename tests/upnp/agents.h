@@ -1,9 +1,16 @@
 /* Agents of the tests below. */
 #pragma once
 
+#include <gtest/gtest.h>
+#include <poll.h>
+#include <sys/syscall.h>
+#include <sys/wait.h>
+#include <unistd.h>
 #include <vorelix/upnp/dmagent.h>
 
+#include <csignal>
 #include <cstdlib>
+#include <functional>
 #include <memory>
 #include <string>
 
@@ -14,6 +21,28 @@ inline std::string takeResponse(DMAgent &agent) {
     const std::unique_ptr<char, decltype(&std::free)> response(agent.response, &std::free);
     agent.response = nullptr;
     return response != nullptr ? response.get() : "(null)";
+}
+
+/* True when work in a child is still under way a while after isDue() has come true. */
+inline bool isUnderWay(
+    const std::function<void()> &work, const std::function<bool()> &isDue = [] { return true; }) {
+    const pid_t child = fork();
+    if (child == 0) {
+        work();
+        _exit(0);
+    }
+    const auto handle = static_cast<int>(syscall(SYS_pidfd_open, child, 0));
+    pollfd end{handle, POLLIN, 0};
+    constexpr int kPatience = 3000;  // tens of milliseconds
+    for (int i = 0; i < kPatience && !isDue() && poll(&end, 1, 10) == 0; ++i) {
+    }
+    EXPECT_TRUE(isDue());
+    poll(&end, 1, 50);
+    kill(child, SIGKILL);
+    int status = 0;
+    waitpid(child, &status, 0);
+    close(handle);
+    return WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL;
 }
 
 }  // namespace upnp_test

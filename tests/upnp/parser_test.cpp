@@ -7,27 +7,16 @@
 #include <fstream>
 
 #include "support/http_server.h"
+#include "support/item_lists.h"
 
 namespace {
-
-void release(ItemList *list) {
-    for (ItemNode *const node : *list) {
-        if (node->children != nullptr) {
-            ItemList *const children = node->children;
-            node->children = nullptr;
-            release(children);
-        }
-        delete node;
-    }
-    delete list;
-}
 
 /* Also releases what the parser made, as its callers do. */
 class Parser : public DMAParser {
   public:
     ~Parser() override {
-        release(containers);
-        release(items);
+        item_lists::release(containers);
+        item_lists::release(items);
     }
     int parse(const std::string &text) { return Parse(text.data(), static_cast<int>(text.size())); }
 };
