@@ -6,6 +6,7 @@
 #include <unordered_map>
 #include <utility>
 
+#include "../query/statements.h"
 #include "engine.h"
 #include "plan.h"
 #include "songs.h"

@@ -14,13 +14,6 @@ constexpr std::int64_t kOutsideBound = 20000;
 /* Of a page that comes from an index; longer ones are fetched piece by piece. */
 constexpr std::int64_t kLongestAnchoredPage = 1000;
 
-const Facet *findFacet(Column column) {
-    const auto &rows = facets();
-    const auto row = std::find_if(rows.begin(), rows.end(),
-                                  [column](const Facet &facet) { return facet.column == column; });
-    return row == rows.end() ? nullptr : &*row;
-}
-
 std::optional<OrderTerm> leadingOf(const std::vector<OrderTerm> &order) {
     if (order.empty()) {
         return OrderTerm{Column::Id, false};

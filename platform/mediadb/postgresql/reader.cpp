@@ -10,7 +10,6 @@
 namespace zano::mediadb::postgresql {
 namespace {
 
-constexpr size_t kMaxIdleReaders = 4;
 constexpr const char *kState = "SELECT name, value FROM state";
 constexpr std::string_view kBegin =
     "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ, READ ONLY; EXECUTE ";
@@ -83,33 +82,10 @@ bool Reader::allPathsBegin(const std::string &prefix) {
     return commonPrefix_->compare(0, prefix.size(), prefix) == 0;
 }
 
-void ReaderPool::forgetOthers() {
-    if (forks_ != forksSoFar()) {
-        for (auto &reader : idle_) {
-            (void)reader.release();
-        }
-    }
-}
-
-std::unique_ptr<Reader> ReaderPool::takeIdle() {
-    const std::lock_guard lock(mutex_);
-    if (forks_ != forksSoFar()) {
-        forgetOthers();
-        idle_.clear();
-        forks_ = forksSoFar();
-    }
-    if (idle_.empty()) {
-        return nullptr;
-    }
-    auto reader = std::move(idle_.back());
-    idle_.pop_back();
-    return reader;
-}
-
 /* An idle connection may have lost its server, which shows when it is used; another host may be
  * there in its place. */
 ReaderPool::Lease ReaderPool::lease() {
-    while (auto reader = takeIdle()) {
+    while (auto reader = idle_.take()) {
         try {
             reader->beginSnapshot();
             return {shared_from_this(), std::move(reader)};
@@ -124,29 +100,9 @@ ReaderPool::Lease ReaderPool::lease() {
     return {shared_from_this(), std::move(reader)};
 }
 
-Reader &ReaderPool::Lease::operator*() const {
-    if (forks_ != forksSoFar()) {
-        throw DatabaseError(KLIB_ERR_DATABASE_FAILED,
-                            "the result was opened before this process was forked off");
-    }
-    return *reader_;
-}
-
-ReaderPool::Lease::~Lease() {
-    if (reader_ != nullptr && forks_ == forksSoFar()) {
-        pool_->giveBack(std::move(reader_));
-    } else {
-        (void)reader_.release();
-    }
-}
-
 void ReaderPool::giveBack(std::unique_ptr<Reader> reader) noexcept {
-    if (!reader->endSnapshot()) {
-        return;
-    }
-    const std::lock_guard lock(mutex_);
-    if (idle_.size() < kMaxIdleReaders) {
-        idle_.push_back(std::move(reader));
+    if (reader->endSnapshot()) {
+        idle_.put(std::move(reader));
     }
 }
 

@@ -3,13 +3,11 @@
 #pragma once
 
 #include <memory>
-#include <mutex>
 #include <optional>
 #include <string>
 #include <utility>
-#include <vector>
 
-#include "../forks.h"
+#include "../reader_lease.h"
 #include "handle.h"
 
 namespace zano::mediadb::postgresql {
@@ -50,41 +48,19 @@ class Reader {
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
   public:
-    explicit ReaderPool(std::string uri) : uri_(std::move(uri)), forks_(forksSoFar()) {}
-    ~ReaderPool() { forgetOthers(); }
-    ReaderPool(const ReaderPool &) = delete;
-    ReaderPool &operator=(const ReaderPool &) = delete;
+    using Lease = ReaderLease<ReaderPool, Reader>;
 
-    /* A reader with a snapshot begun; it goes back when the lease ends. */
-    class Lease {
-      public:
-        Lease(std::shared_ptr<ReaderPool> pool, std::unique_ptr<Reader> reader)
-            : pool_(std::move(pool)), reader_(std::move(reader)), forks_(forksSoFar()) {}
-        ~Lease();
-        Lease(Lease &&) = default;
-        Lease &operator=(Lease &&) = delete;
-        Lease(const Lease &) = delete;
-        Lease &operator=(const Lease &) = delete;
+    explicit ReaderPool(std::string uri) : uri_(std::move(uri)) {}
 
-        /* Throws in a process that was forked off since: the connection is its parent's. */
-        Reader &operator*() const;
-
-      private:
-        std::shared_ptr<ReaderPool> pool_;
-        std::unique_ptr<Reader> reader_;
-        unsigned forks_;
-    };
     Lease lease();
 
   private:
-    void forgetOthers();
-    std::unique_ptr<Reader> takeIdle();
+    friend Lease;
+
     void giveBack(std::unique_ptr<Reader> reader) noexcept;
 
     std::string uri_;
-    std::mutex mutex_;
-    std::vector<std::unique_ptr<Reader>> idle_;
-    unsigned forks_;
+    IdleReaders<Reader> idle_;
 };
 
 }  // namespace zano::mediadb::postgresql

@@ -195,12 +195,6 @@ void addIndexes(Connection &connection, const std::function<void()> &onStep) {
     onStep();
 }
 
-const std::vector<Facet> &facets() {
-    static const std::vector<Facet> rows = {
-        {Column::Artist, 1, "artists"}, {Column::Album, 2, "albums"}, {Column::Genre, 3, "genres"}};
-    return rows;
-}
-
 const std::vector<StoredOrder> &storedOrders() {
     static const std::vector<StoredOrder> rows = [] {
         std::vector<StoredOrder> made;

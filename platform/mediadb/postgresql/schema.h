@@ -26,14 +26,6 @@ void addIndexes(Connection &connection, const std::function<void()> &onStep);
 /* Throws unless the version is the one that this program knows. */
 void requireVersion(std::int64_t version);
 
-/* The columns whose distinct values are kept counted. */
-struct Facet {
-    Column column;
-    int number;              // in the database
-    std::string_view state;  // the name of the count of its values
-};
-const std::vector<Facet> &facets();
-
 /* An order that is read from an index, and for which anchors are kept. */
 struct StoredOrder {
     OrderTerm leading;

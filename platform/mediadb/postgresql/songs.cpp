@@ -2,6 +2,7 @@
 
 #include <utility>
 
+#include "../query/statements.h"
 #include "text/fold.h"
 
 namespace zano::mediadb::postgresql {

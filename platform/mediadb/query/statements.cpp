@@ -1,5 +1,7 @@
 #include "statements.h"
 
+#include <algorithm>
+
 namespace zano::mediadb {
 namespace {
 
@@ -41,6 +43,19 @@ Sql playlistCount(const Dialect &dialect, const Query &query) {
     }
     addCondition(sql.add(") FROM playlists"), query);
     return sql;
+}
+
+const std::vector<Facet> &facets() {
+    static const std::vector<Facet> rows = {
+        {Column::Artist, 1, "artists"}, {Column::Album, 2, "albums"}, {Column::Genre, 3, "genres"}};
+    return rows;
+}
+
+const Facet *findFacet(Column column) {
+    const auto &rows = facets();
+    const auto row = std::find_if(rows.begin(), rows.end(),
+                                  [column](const Facet &facet) { return facet.column == column; });
+    return row == rows.end() ? nullptr : &*row;
 }
 
 bool asksForValues(const Query &query) {

@@ -10,6 +10,7 @@
 #include <utility>
 
 #include "../query/render.h"
+#include "../query/statements.h"
 #include "engine.h"
 #include "grams.h"
 #include "plan.h"

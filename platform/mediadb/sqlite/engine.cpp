@@ -93,11 +93,7 @@ class SongCursor : public StatementCursor {
         if (!plan_.isUnconditional() || !reader().state().isOrdered || !asksForValues(query())) {
             return nullptr;
         }
-        const auto &rows = facets();
-        const auto row = std::find_if(rows.begin(), rows.end(), [this](const Facet &facet) {
-            return facet.column == *query().distinct;
-        });
-        return row == rows.end() ? nullptr : &*row;
+        return findFacet(*query().distinct);
     }
 
     SongPlan plan_;

@@ -5,6 +5,8 @@
 #include <cmath>
 #include <utility>
 
+#include "../query/statements.h"
+
 namespace zano::mediadb::sqlite {
 namespace {
 
@@ -319,10 +321,8 @@ std::int64_t SongPlan::count(std::optional<Column> distinct) {
         }
     }
     if (conjuncts_.empty() && reader_.state().isOrdered) {
-        for (const Facet &facet : facets()) {
-            if (facet.column == *distinct) {
-                return reader_.state().facetCounts.find(facet.state)->second;
-            }
+        if (const Facet *facet = findFacet(*distinct)) {
+            return reader_.state().facetCounts.find(facet->state)->second;
         }
     }
     if (grams_ && grams_->isExact && !distinct) {

@@ -7,14 +7,12 @@
 #include <utility>
 
 #include "../engine.h"
-#include "../forks.h"
 #include "schema.h"
 
 namespace zano::mediadb::sqlite {
 namespace {
 
 constexpr size_t kMaxStatements = 64;
-constexpr size_t kMaxIdleReaders = 4;
 constexpr size_t kMaxGramCounts = 1000;
 /* Steps of SQLite's machine between two looks at the clock: a few rows, since a step may match a
  * pattern with a long text. */
@@ -136,27 +134,11 @@ std::int64_t Reader::integer(const Sql &sql, std::int64_t fallback) {
     return row->step() && !row->isNull(0) ? row->integer(0) : fallback;
 }
 
-ReaderPool::ReaderPool(std::string path) : path_(std::move(path)), forks_(forksSoFar()) {
-    idle_.reserve(kMaxIdleReaders);
-}
-
-ReaderPool::~ReaderPool() {
-    forgetOthers();
-}
-
-/* Connections must not be used in a process that was forked off, not even to close them. */
-void ReaderPool::forgetOthers() {
-    if (forks_ != forksSoFar()) {
-        for (auto &reader : idle_) {
-            (void)reader.release();
-        }
-    }
-}
-
 /* Another file under the same name: a database that was put back from a copy, say. */
 void ReaderPool::followFile() {
     struct stat file {};
     const bool isThere = stat(path_.c_str(), &file) == 0;
+    const std::lock_guard lock(mutex_);
     if (!isThere || file.st_dev != device_ || file.st_ino != inode_) {
         idle_.clear();
         device_ = file.st_dev;
@@ -164,56 +146,22 @@ void ReaderPool::followFile() {
     }
 }
 
-std::unique_ptr<Reader> ReaderPool::takeIdle() {
-    const bool isDue = tick_.isAnother();
-    const std::lock_guard lock(mutex_);
-    if (forks_ != forksSoFar()) {
-        forgetOthers();
-        idle_.clear();
-        forks_ = forksSoFar();
-    }
-    if (isDue || idle_.empty()) {
+ReaderPool::Lease ReaderPool::lease() {
+    if (tick_.isAnother()) {
         followFile();
     }
-    if (idle_.empty()) {
-        return nullptr;
-    }
-    auto reader = std::move(idle_.back());
-    idle_.pop_back();
-    return reader;
-}
-
-ReaderPool::Lease ReaderPool::lease() {
-    auto reader = takeIdle();
+    auto reader = idle_.take();
     if (!reader) {
+        followFile();
         reader = std::make_unique<Reader>(path_);
     }
     reader->beginSnapshot();
     return {shared_from_this(), std::move(reader)};
 }
 
-Reader &ReaderPool::Lease::operator*() const {
-    if (!isOurs()) {
-        throw DatabaseError(KLIB_ERR_DATABASE_FAILED,
-                            "the result was opened before this process was forked off");
-    }
-    return *reader_;
-}
-
-ReaderPool::Lease::~Lease() {
-    if (reader_ != nullptr && isOurs()) {
-        pool_->giveBack(std::move(reader_));
-    } else {
-        (void)reader_.release();
-    }
-}
-
 void ReaderPool::giveBack(std::unique_ptr<Reader> reader) noexcept {
     reader->endSnapshot();
-    const std::lock_guard lock(mutex_);
-    if (idle_.size() < kMaxIdleReaders) {
-        idle_.push_back(std::move(reader));
-    }
+    idle_.put(std::move(reader));
 }
 
 }  // namespace zano::mediadb::sqlite

@@ -19,8 +19,8 @@
 #include <vector>
 
 #include "../clock_tick.h"
-#include "../forks.h"
 #include "../query/render.h"
+#include "../reader_lease.h"
 #include "handle.h"
 
 namespace zano::mediadb::sqlite {
@@ -80,46 +80,22 @@ class Reader {
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
   public:
-    explicit ReaderPool(std::string path);
-    ~ReaderPool();
-    ReaderPool(const ReaderPool &) = delete;
-    ReaderPool &operator=(const ReaderPool &) = delete;
+    using Lease = ReaderLease<ReaderPool, Reader>;
 
-    /* A reader with a snapshot begun; it goes back when the lease ends. */
-    class Lease {
-      public:
-        Lease(std::shared_ptr<ReaderPool> pool, std::unique_ptr<Reader> reader)
-            : pool_(std::move(pool)), reader_(std::move(reader)), forks_(forksSoFar()) {}
-        ~Lease();
-        Lease(Lease &&) = default;
-        Lease &operator=(Lease &&) = delete;
-        Lease(const Lease &) = delete;
-        Lease &operator=(const Lease &) = delete;
+    explicit ReaderPool(std::string path) : path_(std::move(path)) {}
 
-        /* Throws in a process that was forked off since: the connection is its parent's, and
-         * what it would read there need not be of one moment, nor whole. */
-        Reader &operator*() const;
-        /* false in such a process. */
-        bool isOurs() const { return forks_ == forksSoFar(); }
-
-      private:
-        std::shared_ptr<ReaderPool> pool_;
-        std::unique_ptr<Reader> reader_;
-        unsigned forks_;
-    };
     Lease lease();
 
   private:
-    void forgetOthers();
+    friend Lease;
+
     void followFile();
-    std::unique_ptr<Reader> takeIdle();
     void giveBack(std::unique_ptr<Reader> reader) noexcept;
 
     std::string path_;
+    IdleReaders<Reader> idle_;
     ClockTick tick_;
-    std::mutex mutex_;
-    std::vector<std::unique_ptr<Reader>> idle_;
-    unsigned forks_ = 0;
+    std::mutex mutex_;  // of what follows
     dev_t device_ = 0;
     ino_t inode_ = 0;
 };

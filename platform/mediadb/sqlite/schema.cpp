@@ -278,12 +278,6 @@ Connection openForReading(const std::string &path) {
     return connection;
 }
 
-const std::vector<Facet> &facets() {
-    static const std::vector<Facet> rows = {
-        {Column::Artist, 1, "artists"}, {Column::Album, 2, "albums"}, {Column::Genre, 3, "genres"}};
-    return rows;
-}
-
 const std::vector<StoredOrder> &storedOrders() {
     static const std::vector<StoredOrder> rows = {
         {{Column::Title, false}, 1, "songs_by_rank", "", "rank", false},

@@ -30,14 +30,6 @@ Connection openExistingForWriting(const std::string &path);
  * functions. Throws as above, and when the file is missing. */
 Connection openForReading(const std::string &path);
 
-/* The columns whose distinct values are kept counted. */
-struct Facet {
-    Column column;
-    int number;              // on disk
-    std::string_view state;  // the name of the count of its values
-};
-const std::vector<Facet> &facets();
-
 /* An order that is read from an index. */
 struct StoredOrder {
     OrderTerm leading;
