@@ -23,6 +23,7 @@
 #endif
 
 #include "report.h"
+#include "support/item_lists.h"
 
 namespace {
 
@@ -74,17 +75,6 @@ std::string answer(const std::string &result) {
            count + "</TotalMatches><UpdateID>0</UpdateID></u:BrowseResponse></s:Body></s:Envelope>";
 }
 
-void release(ItemList *list) {
-    for (ItemNode *const node : *list) {
-        if (node->children != nullptr) {
-            release(node->children);
-            node->children = nullptr;
-        }
-        delete node;
-    }
-    delete list;
-}
-
 /* In bytes of all keys and values, so that the ways can be compared. */
 std::size_t sizeOf(const std::map<std::string, std::string> &values) {
     std::size_t size = 0;
@@ -107,8 +97,8 @@ std::size_t throughLibrary(const std::string &body) {
     for (const ItemNode *const item : *parser.items) {
         size += sizeOf(*item) + sizeOf(*item->children->front());
     }
-    release(parser.items);
-    release(parser.containers);
+    item_lists::release(parser.items);
+    item_lists::release(parser.containers);
     return size;
 }
 
