@@ -5,6 +5,7 @@
 #include <sys/resource.h>
 
 #include <csignal>
+#include <cstddef>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -23,10 +24,18 @@ inline std::string read(const std::string &path) {
     return file ? std::string(std::istreambuf_iterator<char>(file), {}) : "(no file)";
 }
 
-/* A folder of its own, removed at the end. */
+/* How many files and folders a folder holds. */
+inline std::ptrdiff_t countIn(const std::string &folder) {
+    return std::distance(std::filesystem::directory_iterator(folder), {});
+}
+
+/* A folder of its own, by its path without links; removed at the end. */
 class Folder {
   public:
-    Folder() { EXPECT_NE(mkdtemp(path_.data()), nullptr); }
+    Folder() {
+        EXPECT_NE(mkdtemp(path_.data()), nullptr);
+        path_ = std::filesystem::canonical(path_);
+    }
     ~Folder() { std::filesystem::remove_all(path_); }
     Folder(const Folder &) = delete;
     Folder &operator=(const Folder &) = delete;

@@ -4,18 +4,10 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 #include <string>
 #include <vector>
 
 namespace zano::playlists {
-
-inline std::string contentsOf(const std::filesystem::path &path) {
-    std::ostringstream text;
-    text << std::ifstream(path, std::ios::binary).rdbuf();
-    return text.str();
-}
 
 inline std::vector<std::filesystem::path> samples() {
     std::vector<std::filesystem::path> paths;

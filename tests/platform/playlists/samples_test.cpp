@@ -3,6 +3,7 @@
 #include "format.h"
 #include "locations.h"
 #include "music.h"
+#include "support/files.h"
 #include "text.h"
 
 namespace zano::playlists {
@@ -27,8 +28,8 @@ TEST_F(SamplesTest, AreReadAsTheirDumpsSay) {
     ASSERT_GT(samples().size(), 30U);
     for (const auto &sample : samples()) {
         const std::string name = sample.filename().string();
-        const std::string path = write(name, placedAt(music().string(), contentsOf(sample)));
-        EXPECT_EQ(dump(path), contentsOf(sample.string() + ".dump")) << name;
+        const std::string path = write(name, placedAt(music().string(), files::read(sample)));
+        EXPECT_EQ(dump(path), files::read(sample.string() + ".dump")) << name;
         std::filesystem::remove(path);
     }
 }
@@ -37,7 +38,7 @@ TEST_F(SamplesTest, AreReadAsTheirDumpsSay) {
  * nothing behind the end is looked at. */
 TEST_F(SamplesTest, CutAtEveryByteAreReadOrRefused) {
     for (const auto &sample : samples()) {
-        const std::string whole = contentsOf(sample);
+        const std::string whole = files::read(sample);
         for (std::size_t size = 0; size < whole.size(); ++size) {
             const std::vector<char> bytes(whole.begin(),
                                           whole.begin() + static_cast<std::ptrdiff_t>(size));
@@ -58,7 +59,7 @@ TEST_F(SamplesTest, CutAtEveryByteAreReadOrRefused) {
 }
 
 TEST(M3u, ACutListKeepsTheEntriesBeforeTheCut) {
-    const std::string whole = contentsOf(std::filesystem::path(VORELIX_SAMPLES) / "library.m3u");
+    const std::string whole = files::read(std::filesystem::path(VORELIX_SAMPLES) / "library.m3u");
     Playlist all;
     readM3u(whole, all);
     for (std::size_t size = 0; size < whole.size(); ++size) {

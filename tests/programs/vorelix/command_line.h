@@ -6,7 +6,6 @@
 
 #include <gtest/gtest.h>
 #include <json/value.h>
-#include <sys/types.h>
 
 #include <filesystem>
 #include <map>
@@ -14,22 +13,20 @@
 #include <vector>
 
 #include "mediadb/catalogue.h"
+#include "platform/mediadb/cluster.h"
+#include "support/files.h"
+#include "support/program.h"
 
 namespace command_line {
 
-struct Ended {
-    int status;  // exit code, or 128 and the number of the signal
-    std::string out;
-    std::string err;
-};
-
-/* What standard output of the program is. */
-enum class Output { File, ClosedPipe, Full, Terminal };
+using program::Ended;
+using program::statusOf;
+using Output = program::Stream;
 
 struct Invocation {
     std::vector<std::string> arguments;
     std::map<std::string, std::string> environment = {};  // nothing else is set
-    Output output = Output::File;
+    Output output = Output::Kept;
     unsigned short columns = 0;  // of the terminal
     std::string input = {};
     unsigned long fileSizeLimit = 0;  // in bytes, as of a full disk; 0: none
@@ -39,9 +36,6 @@ Ended run(const Invocation &invocation);
 
 /* Without its output, and without waiting for it. */
 pid_t start(const Invocation &invocation);
-
-/* As Ended::status. */
-int statusOf(pid_t child);
 
 /* Each test starts without a database and with a setting that names where it would be. */
 class CommandLine : public testing::Test {
@@ -55,9 +49,13 @@ class CommandLine : public testing::Test {
     /* Runs with --json and gives the document; fails the test when there is none. */
     static Json::Value answerOf(std::vector<std::string> arguments);
 
-    std::filesystem::path folder_;
-    std::filesystem::path database_;  // a file of SQLite
-    std::string location_;
+  private:
+    files::Folder temporary_;
+
+  protected:
+    const std::filesystem::path database_ = temporary_.path("media.db");
+    const std::filesystem::path folder_ = database_.parent_path();
+    const std::string location_ = zano::mediadb::locationForTest(database_);
 };
 
 }  // namespace command_line

@@ -37,9 +37,9 @@ TEST_F(DeleteTest, RemovesTheRowsOfAFile) {
     EXPECT_EQ(paths(), (Lines{"a/2.mp3", "a/3.mp3"}));
     EXPECT_EQ(playlists(), 0U);
     // as a user may write it, and when the file is gone
-    fs::create_directory_symlink(music(), folder_ / "link");
+    fs::create_directory_symlink(music(), path("link"));
     fs::remove(music() + "/a/2.mp3");
-    EXPECT_EQ(run({"-d", (folder_ / "link/a/./2.mp3").string()}).status, 0);
+    EXPECT_EQ(run({"-d", path("link/a/./2.mp3")}).status, 0);
     EXPECT_EQ(paths(), Lines{"a/3.mp3"});
 }
 
@@ -47,7 +47,7 @@ TEST_F(DeleteTest, AsTheLibraryStartsIt) {
     fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
     std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << location() << "\"\n";
     for (const auto &path : {music() + "/a/1.mp3", list_, std::string("/nowhere")}) {
-        const auto ended = Process(ZANOINDEX_PROGRAM, {"-d", path}).wait();
+        const auto ended = Process({ZANOINDEX_PROGRAM, {"-d", path}}).wait();
         EXPECT_EQ(ended.status, 0) << path;
         EXPECT_EQ(ended.out + ended.err, "") << "its output is somebody's answer";
     }
@@ -55,7 +55,7 @@ TEST_F(DeleteTest, AsTheLibraryStartsIt) {
     EXPECT_EQ(playlists(), 0U);
 
     std::ofstream(ZANO_PATH_CONF) << "mediadb=\"sqlite:" << music() << "\"\n";
-    const auto ended = Process(ZANOINDEX_PROGRAM, {"-d", "/nowhere"}).wait();
+    const auto ended = Process({ZANOINDEX_PROGRAM, {"-d", "/nowhere"}}).wait();
     EXPECT_EQ(ended.status, 1) << "a failure is told";
     EXPECT_NE(ended.err.find(music()), std::string::npos) << ended.err;
     fs::remove(ZANO_PATH_CONF);

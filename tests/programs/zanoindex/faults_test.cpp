@@ -65,8 +65,9 @@ class FaultsTest : public IndexTest {
     }
 
     std::unique_ptr<Process> startFaulty(const Lines &arguments,
-                                         Process::Errors errors = Process::Errors::kFile) const {
-        return std::make_unique<Process>(ZANOINDEX_FAULTY, argumentsOf(arguments), errors);
+                                         program::Stream errors = program::Stream::Kept) const {
+        return std::make_unique<Process>(program::Start{
+            .path = ZANOINDEX_FAULTY, .argv = argumentsOf(arguments), .errors = errors});
     }
     void check() const { EXPECT_NO_THROW(mediadb::openCatalogue(location())->check()); }
 };
@@ -150,7 +151,7 @@ TEST_F(FaultsTest, KilledAtAnyMoment) {
         add("kept/" + std::to_string(i) + ".mp3");
     }
     runFaulty({music()});
-    const auto earlier = folder_ / "earlier.db";
+    const auto earlier = path("earlier.db");
     fs::copy_file(databaseFile(), earlier);
     for (int i = 0; i < 40; ++i) {
         fs::remove(music() + "/old/" + std::to_string(i) + ".ogg");
@@ -160,7 +161,7 @@ TEST_F(FaultsTest, KilledAtAnyMoment) {
 
     const auto start = [&](bool isFirst) {
         for (const char *suffix : {"", "-wal", "-shm"}) {
-            fs::remove(databaseFile().string() + suffix);
+            fs::remove(databaseFile() + suffix);
         }
         if (!isFirst) {
             fs::copy_file(earlier, databaseFile());
@@ -170,7 +171,7 @@ TEST_F(FaultsTest, KilledAtAnyMoment) {
         for (const auto &folder : fs::directory_iterator(music())) {
             observer.watch(folder.path(), IN_CLOSE_NOWRITE);
         }
-        observer.watch(folder_, IN_MODIFY | IN_CREATE | IN_DELETE);
+        observer.watch(path(""), IN_MODIFY | IN_CREATE | IN_DELETE);
     };
 
     std::array<int, 2> eventsOfAll{};
@@ -247,7 +248,7 @@ TEST_F(FaultsTest, NoReaderOutlivesAKilledIndexer) {
 TEST_F(FaultsTest, BarOnATerminal) {
     add("a.mp3");
     add("stall.mp3");
-    const auto ended = startFaulty({music()}, Process::Errors::kTerminal)->wait();
+    const auto ended = startFaulty({music()}, program::Stream::Terminal)->wait();
     EXPECT_NE(ended.err.find("\r\033[K["), std::string::npos) << ended.err;
     EXPECT_NE(ended.err.find("reading tags: 1 of 2 files"), std::string::npos) << ended.err;
     EXPECT_TRUE(ended.out.starts_with("2 files in ")) << ended.out;

@@ -3,7 +3,6 @@
 
 #include <gtest/gtest.h>
 #include <json/value.h>
-#include <sys/types.h>
 #include <vorelix/records.h>
 #include <filesystem>
 #include <functional>
@@ -14,61 +13,27 @@
 #include "mediadb/catalogue.h"
 #include "mediadb/engine.h"
 #include "mediadb/query/columns.h"
+#include "support/files.h"
+#include "support/program.h"
 
 namespace zano::index {
 
 namespace fs = std::filesystem;
 
-struct Ended {
-    int status = 0;  // exit code, or 128 and the number of the signal
-    std::string out;
-    std::string err;
-    long peakKilobytes = 0;  // of the largest of all processes up to now
-};
+using program::Ended;
+using program::Process;
 
-/* A process; killed if it is still there at the end. */
-class Process {
-  public:
-    enum class Errors { kFile, kTerminal };
-
-    /* argv[0] may be other than the program. */
-    Process(const std::string &program, const std::vector<std::string> &argv,
-            Errors errors = Errors::kFile, bool mayReadEverything = true);
-    Process(const Process &) = delete;
-    Process &operator=(const Process &) = delete;
-    ~Process();
-
-    pid_t pid() const { return pid_; }
-    /* For poll(): hung up when the process has ended. */
-    int output() const { return output_; }
-    /* The next line of standard output; fails the test when none comes within a minute. */
-    std::string readLine();
-    Ended wait();
-
-  private:
-    bool readMore();
-
-    pid_t pid_ = -1;
-    int output_ = -1;
-    int errors_ = -1;
-    bool isTerminal_ = false;
-    std::string out_;
-};
-
-class IndexTest : public testing::Test {
+class IndexTest : public testing::Test, protected files::Folder {
   protected:
     IndexTest();
-    ~IndexTest() override;
 
     static std::string sample(const std::string &suffix);
 
     /* Puts a sample below the music folder; gives its path. */
     std::string add(const std::string &name, const std::string &suffix = "mp3") const;
-    static void write(const fs::path &path, const std::string &content);
-    static std::string contentOf(const fs::path &path);
 
-    std::string music() const { return folder_ / "music"; }
-    fs::path databaseFile() const { return folder_ / "media.db"; }
+    std::string music() const { return path("music"); }
+    std::string databaseFile() const { return path("media.db"); }
     const std::string &location() const { return location_; }
     std::unique_ptr<mediadb::Engine> engine() const { return mediadb::makeEngine(location()); }
 
@@ -89,8 +54,6 @@ class IndexTest : public testing::Test {
 
     /* All playlists in order of their paths: "path below the music folder|title|folder". */
     std::vector<std::string> playlists() const;
-
-    fs::path folder_;
 
   private:
     std::vector<std::string> rows(const std::function<std::string(const ZANO_MEDIA_INFO &)> &toLine,

@@ -10,8 +10,8 @@ using Lines = std::vector<std::string>;
 class WatchTest : public IndexTest {
   protected:
     void start() {
-        process_ = std::make_unique<Process>(ZANOINDEX_PROGRAM,
-                                             argumentsOf({"--json", "--watch", music()}));
+        process_ = std::make_unique<Process>(
+            program::Start{ZANOINDEX_PROGRAM, argumentsOf({"--json", "--watch", music()})});
         EXPECT_FALSE(parsed(process_->readLine())["stopped"].asBool());
     }
 
@@ -63,21 +63,21 @@ TEST_F(WatchTest, FollowsFilesAndFolders) {
     await(1, 0, 0);
 
     // an album moved in from elsewhere, and links
-    fs::create_directories(folder_ / "elsewhere/album");
-    fs::copy_file(sample("opus"), folder_ / "elsewhere/album/6.opus");
-    fs::rename(folder_ / "elsewhere/album", music() + "/album");
+    fs::create_directories(path("elsewhere/album"));
+    fs::copy_file(sample("opus"), path("elsewhere/album/6.opus"));
+    fs::rename(path("elsewhere/album"), music() + "/album");
     fs::create_hard_link(music() + "/b/2.mp3", music() + "/b/hard.mp3");
     fs::create_symlink(music() + "/b/2.mp3", music() + "/b/soft.mp3");
     await(3, 0, 0);
 
     // a playlist comes and goes
-    write(music() + "/b/list.m3u", "2.mp3\n");
+    files::write(music() + "/b/list.m3u", "2.mp3\n");
     EXPECT_EQ(parsed(process_->readLine())["playlistsAdded"], 1);
     fs::remove(music() + "/b/list.m3u");
     EXPECT_EQ(parsed(process_->readLine())["playlistsRemoved"], 1);
 
     // moved out, and deleted
-    fs::rename(music() + "/album", folder_ / "elsewhere/album");
+    fs::rename(music() + "/album", path("elsewhere/album"));
     fs::remove_all(music() + "/renamed");
     await(0, 0, 4);
     EXPECT_EQ(paths(), (Lines{"a/1.mp3", "a/new.ogg", "b/2.mp3", "b/hard.mp3", "b/soft.mp3"}));
@@ -87,7 +87,7 @@ TEST_F(WatchTest, FollowsFilesAndFolders) {
 TEST_F(WatchTest, NamesWhatItCannotRead) {
     add("a.mp3");
     start();
-    write(music() + "/b.mp3", "no music");
+    files::write(music() + "/b.mp3", "no music");
     const auto summary = parsed(process_->readLine());
     EXPECT_EQ(summary["failed"].size(), 1U);
     const auto ended = stop(SIGTERM);
@@ -98,7 +98,7 @@ TEST_F(WatchTest, NamesWhatItCannotRead) {
 TEST_F(WatchTest, EndsWhenNothingIsLeft) {
     add("a.mp3");
     start();
-    fs::rename(music(), folder_ / "moved");
+    fs::rename(music(), path("moved"));
     const auto ended = process_->wait();
     EXPECT_EQ(ended.status, 1);
     EXPECT_NE(ended.err.find("no folder is left to watch"), std::string::npos) << ended.err;
