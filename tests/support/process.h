@@ -1,12 +1,15 @@
-/* Programs that tests run. */
+/* Commands, and work in processes of its own, that tests run. */
 #pragma once
 
 #include <gtest/gtest.h>
 #include <sys/wait.h>
+#include <unistd.h>
 
 #include <array>
 #include <cstdio>
+#include <functional>
 #include <string>
+#include <vector>
 
 namespace process {
 
@@ -32,6 +35,38 @@ inline std::string textOf(const std::string &command) {
     const Outcome outcome = run(command);
     EXPECT_EQ(outcome.status, 0) << command << '\n' << outcome.text;
     return outcome.text;
+}
+
+/* Waits for a child: its exit code, or 128 and the number of the signal. */
+inline int statusOf(pid_t child) {
+    int status = 0;
+    EXPECT_EQ(waitpid(child, &status, 0), child);
+    return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
+}
+
+/* A child whose exit code is the result of the work; 99 when that throws. */
+inline pid_t start(const std::function<int()> &work) {
+    const pid_t child = fork();
+    if (child == 0) {
+        try {
+            _exit(work());
+        } catch (const std::exception &error) {
+            std::fprintf(stderr, "%s\n", error.what());
+            _exit(99);
+        }
+    }
+    return child;
+}
+
+/* The work in so many children at once, which are told their numbers; each has to give 0. */
+inline void runAtOnce(int count, const std::function<int(int number)> &work) {
+    std::vector<pid_t> children;
+    for (int number = 0; number < count; ++number) {
+        children.push_back(start([&] { return work(number); }));
+    }
+    for (const pid_t child : children) {
+        EXPECT_EQ(statusOf(child), 0);
+    }
 }
 
 }  // namespace process

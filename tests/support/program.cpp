@@ -197,10 +197,4 @@ pid_t Process::release() {
     return std::exchange(pid_, -1);
 }
 
-int statusOf(pid_t child) {
-    int status = 0;
-    EXPECT_EQ(waitpid(child, &status, 0), child);
-    return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
-}
-
 }  // namespace program

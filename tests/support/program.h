@@ -8,7 +8,11 @@
 #include <string>
 #include <vector>
 
+#include "support/process.h"
+
 namespace program {
+
+using process::statusOf;
 
 struct Ended {
     int status;  // exit code, or 128 and the number of the signal
@@ -58,8 +62,5 @@ class Process {
     bool haveErrorsAnEnd_;  // as those of a terminal, that ends with its last writer
     std::string out_;
 };
-
-/* Waits for a child; as Ended::status. */
-int statusOf(pid_t child);
 
 }  // namespace program

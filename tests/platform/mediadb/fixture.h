@@ -73,6 +73,11 @@ class MediaDatabaseTest : public testing::Test {
         int limit = 0;
     };
 
+    void putThreeSongs() const {
+        put(*openCatalogue(location()), {song("/music/a", "One"), song("/music/b", "Two"),
+                                         song("/music/c", std::string(4000, 'a'))});
+    }
+
     /* The rows of a query as lines of the selected fields' texts: "title" or "path". A failed
      * open gives one line "failed: " with the error's text. */
     static std::vector<std::string> rows(const char *condition, const char *order,

@@ -1,11 +1,7 @@
 /* What is of PostgreSQL only: several writers, lost connections, rights. */
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <functional>
-
 #include "cluster.h"
 #include "fixture.h"
+#include "support/process.h"
 
 namespace zano::mediadb {
 namespace {
@@ -28,35 +24,14 @@ class PostgresqlTest : public MediaDatabaseTest {
         }
         catalogue->finish({});
     }
-
-    /* Runs the action in so many processes at once. */
-    void expectAllSucceed(int count, const std::function<void(int number)> &action) {
-        std::vector<pid_t> children;
-        for (int i = 0; i < count; ++i) {
-            children.push_back(fork());
-            if (children.back() == 0) {
-                try {
-                    action(i);
-                    _exit(0);
-                } catch (const std::exception &error) {
-                    std::fprintf(stderr, "%s\n", error.what());
-                    _exit(1);
-                }
-            }
-        }
-        for (const pid_t child : children) {
-            int status = -1;
-            waitpid(child, &status, 0);
-            EXPECT_EQ(status, 0);
-        }
-    }
 };
 
 /* They share artists, and each sets anchors while others still write. */
 TEST_F(PostgresqlTest, SeveralIndexersOfDifferentFoldersDoNotDisturbEachOther) {
     constexpr int kIndexers = 5;
-    expectAllSucceed(kIndexers, [this](int indexer) {
+    process::runAtOnce(kIndexers, [this](int indexer) {
         index(location(), "/music/" + std::to_string(indexer) + "/", 400);
+        return 0;
     });
     auto catalogue = openCatalogue(location());
     EXPECT_EQ(catalogue->songCount(), kIndexers * 400);
@@ -76,7 +51,7 @@ TEST_F(PostgresqlTest, SeveralIndexersOfOneFolderTakeTurns) {
     constexpr int kIndexers = 4;
     constexpr int kSongs = 120;
     openCatalogue(location()).reset();
-    expectAllSucceed(kIndexers, [this](int indexer) {
+    process::runAtOnce(kIndexers, [this](int indexer) {
         auto catalogue = openCatalogue(location());
         for (int batch = 0; batch < 5; ++batch) {
             catalogue->begin();
@@ -91,6 +66,7 @@ TEST_F(PostgresqlTest, SeveralIndexersOfOneFolderTakeTurns) {
             catalogue->commit();
         }
         catalogue->finish({});
+        return 0;
     });
     EXPECT_NO_THROW(openCatalogue(location())->check());
     EXPECT_EQ(static_cast<int>(rows(nullptr, "path").size()),

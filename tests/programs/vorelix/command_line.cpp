@@ -1,9 +1,6 @@
 #include "command_line.h"
 
-#include <json/reader.h>
-
-#include <sstream>
-
+#include "support/json.h"
 #include "system_paths_internal.h"
 
 namespace command_line {
@@ -59,12 +56,7 @@ Json::Value CommandLine::answerOf(std::vector<std::string> arguments) {
     arguments.emplace_back("--json");
     const Ended ended = run({arguments});
     EXPECT_EQ(ended.err, "");
-    std::istringstream text(ended.out);
-    Json::Value answer;
-    std::string errors;
-    EXPECT_TRUE(Json::parseFromStream(Json::CharReaderBuilder(), text, &answer, &errors))
-        << errors << ended.out;
-    return answer;
+    return json::parsed(ended.out);
 }
 
 }  // namespace command_line

@@ -199,19 +199,26 @@ TEST_F(CommandLine, PagesAtTheEnds) {
     for (int i = 1; i <= 101; ++i) {
         songs.push_back(song(("/m/" + std::to_string(i)).c_str(), std::to_string(1000 + i)));
     }
+    songs[99].title += " --page it's \x1b";
+    songs[100].title += " --page it's \x1b";
     fill(songs);
     const struct {
         std::vector<std::string> arguments;
         const char *line;  // the last one
     } cases[] = {
-        {{"list", "--page", "2"}, "songs 51-100 of 101 (page 2 of 3; next: vorelix list --page 3)"},
+        {{"list", "--desc", "--page=2"},
+         "songs 51-100 of 101 (page 2 of 3; next: vorelix list --desc --page 3)"},
         {{"list", "--page", "3"}, "songs 101-101 of 101 (page 3 of 3)"},
         {{"list", "--page", "4"}, "no songs here: there are 101 in all, on pages 1 to 3"},
         {{"list", "--page-size", "101"}, "songs 1-101 of 101"},
         {{"search", "10", "--page-size", "100"},
          "songs 1-100 of 101 (page 1 of 2; next: vorelix search 10 --page-size 100 --page 2)"},
         {{"list", "--offset", "100"}, "songs 101-101 of 101"},
-        {{"list", "--limit", "1"}, "songs 1-1 of 101 (next: vorelix list --limit 1 --offset 1)"},
+        {{"list", "--offset", "3", "--limit", "2"},
+         "songs 4-5 of 101 (next: vorelix list --limit 2 --offset 5)"},
+        {{"search", "--page-size", "1", "--", "--page it's \x1b"},
+         "songs 1-1 of 2 (page 1 of 2; next: vorelix search --page-size 1 --page 2 -- "
+         "'--page it'\\''s ␛')"},
         {{"list", "--offset", "2147483647"}, "no songs here: there are 101 in all"},
         {{"random", "5"}, "5 of 101 songs, by chance"},
     };

@@ -284,22 +284,15 @@ TEST_F(Playlists, FilesThatAreNoPlaylistsStayAsTheyAre) {
 
 TEST_F(Playlists, EditsAtOnceLoseNothing) {
     says({"create", "p"});
-    std::vector<pid_t> writers;
-    for (const std::string id : {"1", "2"}) {
-        writers.push_back(fork());
-        if (writers.back() == 0) {
-            int failures = 0;
-            Words words = {"playlist", "append", "p", "--wait", "300"};
-            words.insert(words.end(), 10, id);
-            for (int call = 0; call < 50; ++call) {
-                failures += run({words}).status == 0 ? 0 : 1;
-            }
-            _exit(failures);
+    process::runAtOnce(2, [](int writer) {
+        int failures = 0;
+        Words words = {"playlist", "append", "p", "--wait", "300"};
+        words.insert(words.end(), 10, std::to_string(writer + 1));
+        for (int call = 0; call < 50; ++call) {
+            failures += run({words}).status == 0 ? 0 : 1;
         }
-    }
-    for (const pid_t writer : writers) {
-        EXPECT_EQ(statusOf(writer), 0);
-    }
+        return failures;
+    });
     const std::string entries = entriesOf({"p"});
     EXPECT_EQ(std::count(entries.begin(), entries.end(), 'a'), 500);
     EXPECT_EQ(std::count(entries.begin(), entries.end(), 'b'), 500);
@@ -360,24 +353,11 @@ TEST_F(Playlists, AFullDiskLeavesTheOldOne) {
 TEST_F(Playlists, AnEditWaitsForAnother) {
     says({"create", "p", "1"});
     const std::string before = files::read(folderOfShared_ / "p.m3u");
-    int held[2];
-    int released[2];
-    ASSERT_EQ(pipe2(held, O_CLOEXEC) + pipe2(released, O_CLOEXEC), 0);
-    const pid_t holder = fork();
-    if (holder == 0) {
-        close(released[1]);
-        struct flock lock {};
-        lock.l_type = F_WRLCK;
-        const fs::path draft = folderOfShared_ / ".p.vorelix.m3u";
-        const int descriptor = open(draft.c_str(), O_RDWR | O_CREAT, 0666);
-        const bool isHeld = fcntl(descriptor, F_OFD_SETLK, &lock) == 0;
-        char byte = isHeld ? 'y' : 'n';
-        _exit(write(held[1], &byte, 1) == 1 && read(released[0], &byte, 1) == 0 ? 0 : 1);
-    }
-    close(released[0]);
-    char isHeld = 0;
-    ASSERT_EQ(read(held[0], &isHeld, 1), 1);
-    ASSERT_EQ(isHeld, 'y');
+    const fs::path draft = folderOfShared_ / ".p.vorelix.m3u";
+    const int other = open(draft.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666);
+    struct flock lock {};
+    lock.l_type = F_WRLCK;
+    ASSERT_EQ(fcntl(other, F_OFD_SETLK, &lock), 0);
     for (const Words &words :
          {Words{"append", "p", "2"}, Words{"delete", "p"}, Words{"create", "p", "--force"}}) {
         Words atOnce = words;
@@ -386,8 +366,7 @@ TEST_F(Playlists, AnEditWaitsForAnother) {
         EXPECT_EQ(files::read(folderOfShared_ / "p.m3u"), before);
     }
     const pid_t waiting = start({.arguments = {"playlist", "append", "p", "2", "--wait", "300"}});
-    close(released[1]);
-    EXPECT_EQ(statusOf(holder), 0);
+    close(other);
     EXPECT_EQ(statusOf(waiting), 0);
     EXPECT_EQ(entriesOf({"p"}), "ab");
     EXPECT_EQ(filesOfShared(), 1);

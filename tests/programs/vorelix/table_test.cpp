@@ -18,29 +18,26 @@ Table songs() {
     return table;
 }
 
-TEST(Table, WithoutLimitNothingIsCut) {
-    EXPECT_EQ(songs().render({}),
-              "  ID  Title                        Artist             Time\n"
-              "   7  音楽                                            3:05\n"
-              "1234  A title that is rather long  ␛[1mSomebody e\u0301lse\n");
-}
-
-TEST(Table, TheWidestColumnGivesWayFirst) {
-    EXPECT_EQ(songs().render({.width = 50}),
-              "  ID  Title                Artist             Time\n"
-              "   7  音楽                                    3:05\n"
-              "1234  A title that is ra…  ␛[1mSomebody e\u0301lse\n");
-}
-
-TEST(Table, ColumnsAreLeftOutByRank) {
-    EXPECT_EQ(songs().render({.width = 45}),
-              "  ID  Title                 Artist\n"
-              "   7  音楽\n"
-              "1234  A title that is rat…  ␛[1mSomebody e\u0301lse\n");
-    EXPECT_EQ(songs().render({.width = 12}),
-              "  ID  Title\n"
-              "   7  音楽\n"
-              "1234  A tit…\n");
+/* The widest column gives way first; then columns are left out by their rank. */
+TEST(Table, IsFittedToTheTerminal) {
+    const std::pair<int, const char *> cases[] = {
+        {0,
+         "  ID  Title                        Artist             Time\n"
+         "   7  音楽                                            3:05\n"
+         "1234  A title that is rather long  ␛[1mSomebody e\u0301lse\n"},
+        {50,
+         "  ID  Title                Artist             Time\n"
+         "   7  音楽                                    3:05\n"
+         "1234  A title that is ra…  ␛[1mSomebody e\u0301lse\n"},
+        {45,
+         "  ID  Title                 Artist\n"
+         "   7  音楽\n"
+         "1234  A title that is rat…  ␛[1mSomebody e\u0301lse\n"},
+        {12, "  ID  Title\n   7  音楽\n1234  A tit…\n"},
+    };
+    for (const auto &[width, text] : cases) {
+        EXPECT_EQ(songs().render({.width = width}), text) << width;
+    }
 }
 
 TEST(Table, NoLineIsWiderThanTheTerminal) {
@@ -50,12 +47,6 @@ TEST(Table, NoLineIsWiderThanTheTerminal) {
             EXPECT_LE(displayWidth(line), width) << line;
         }
     }
-}
-
-TEST(Table, OnlyTheHeaderIsBold) {
-    Table table({{.header = "Artist"}});
-    table.addRow({"x"});
-    EXPECT_EQ(table.render({.bold = true}), "\x1b[1mArtist\x1b[0m\nx\n");
 }
 
 }  // namespace

@@ -1,8 +1,7 @@
-#include <json/writer.h>
-
 #include <cstring>
 #include <thread>
 
+#include "support/json.h"
 #include "support/process.h"
 #include "system_paths_internal.h"
 #include "web_server.h"
@@ -10,12 +9,7 @@
 namespace web_test {
 namespace {
 
-std::string textOf(const Json::Value &value) {
-    Json::StreamWriterBuilder writer;
-    writer["indentation"] = "";
-    writer["emitUTF8"] = true;
-    return Json::writeString(writer, value);
-}
+using json::textOf;
 
 std::string titlesOf(const Json::Value &songs) {
     std::string titles;

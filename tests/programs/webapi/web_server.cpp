@@ -1,7 +1,6 @@
 #include "web_server.h"
 
 #include <arpa/inet.h>
-#include <json/reader.h>
 #include <netinet/in.h>
 #include <sys/prctl.h>
 #include <sys/socket.h>
@@ -14,6 +13,7 @@
 #include <regex>
 
 #include "mediadb/catalogue.h"
+#include "support/json.h"
 #include "system_paths_internal.h"
 
 namespace web_test {
@@ -88,12 +88,7 @@ Answer parsed(const std::string &text) {
 }  // namespace
 
 Json::Value Answer::json() const {
-    Json::Value value;
-    const std::unique_ptr<Json::CharReader> reader(Json::CharReaderBuilder().newCharReader());
-    std::string errors;
-    EXPECT_TRUE(reader->parse(body.data(), body.data() + body.size(), &value, &errors))
-        << status << " " << errors << body.substr(0, 200);
-    return value;
+    return ::json::parsed(body);
 }
 
 std::string Answer::outcome() const {

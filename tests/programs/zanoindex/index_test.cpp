@@ -1,6 +1,5 @@
 #include "index_test.h"
 
-#include <json/reader.h>
 #include <iomanip>
 #include <memory>
 #include <sstream>
@@ -38,15 +37,6 @@ Ended IndexTest::run(const std::vector<std::string> &arguments) const {
 
 Ended IndexTest::runFaulty(const std::vector<std::string> &arguments) const {
     return Process({ZANOINDEX_FAULTY, argumentsOf(arguments)}).wait();
-}
-
-Json::Value IndexTest::parsed(const std::string &line) {
-    Json::Value value;
-    std::istringstream stream(line);
-    std::string errors;
-    EXPECT_TRUE(Json::parseFromStream(Json::CharReaderBuilder(), stream, &value, &errors))
-        << errors << line;
-    return value;
 }
 
 Json::Value IndexTest::summaryOf(std::vector<std::string> arguments, int status) const {

@@ -2,7 +2,6 @@
 #pragma once
 
 #include <gtest/gtest.h>
-#include <json/value.h>
 #include <vorelix/records.h>
 #include <filesystem>
 #include <functional>
@@ -14,12 +13,14 @@
 #include "mediadb/engine.h"
 #include "mediadb/query/columns.h"
 #include "support/files.h"
+#include "support/json.h"
 #include "support/program.h"
 
 namespace zano::index {
 
 namespace fs = std::filesystem;
 
+using json::parsed;
 using program::Ended;
 using program::Process;
 
@@ -43,7 +44,6 @@ class IndexTest : public testing::Test, protected files::Folder {
     Ended runFaulty(const std::vector<std::string> &arguments) const;
     /* Runs with --json and gives the summary; the exit code must be the expected one. */
     Json::Value summaryOf(std::vector<std::string> arguments, int status = 0) const;
-    static Json::Value parsed(const std::string &line);
 
     /* All songs in order of their paths, each as one line: path below the music folder, title,
      * artist, album, album artist, genre, year, track, disc, with | between. */
