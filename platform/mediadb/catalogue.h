@@ -107,9 +107,10 @@ class Catalogue {
     /* Ends a scan, outside of a batch: brings the order and search indexes up to date with all
      * songs and refreshes the planner's statistics. Cheap when nothing changed. A first scan
      * builds them only here, and lists slowly but rightly until then; a kill in the middle
-     * loses nothing but this work. progress (may be empty) is called with parts done and in all. */
+     * loses nothing but this work. progress (may be empty) is called with parts done and in all.
+     * false: there was nothing to do. */
     using Progress = std::function<void(int done, int total)>;
-    virtual void finish(const Progress &progress) = 0;
+    virtual bool finish(const Progress &progress) = 0;
 
     /* The number of songs. */
     virtual std::int64_t songCount() = 0;
@@ -118,8 +119,8 @@ class Catalogue {
     virtual std::vector<Notice> notices(int limit) = 0;
     virtual void removeNotice(std::int64_t id) = 0;
 
-    /* Throws when the database is damaged: the engine's own check, and that orders and search
-     * index agree with the songs. */
+    /* Throws when the database is damaged: the engine's own check, and that keys, orders, search
+     * index, counted values and anchors agree with the rows. Writes nothing. */
     virtual void check() = 0;
 
   protected:

@@ -13,10 +13,10 @@
 
 #include "clock_tick.h"
 #include "engine.h"
+#include "guarded.h"
 #include "postgresql/engine.h"
 #include "query/parse.h"
 #include "sqlite/engine.h"
-#include "strings/error_internal.h"
 #include "system_paths_internal.h"
 
 namespace zano::mediadb {
@@ -26,11 +26,16 @@ struct EngineKind {
     std::string_view scheme;
     std::unique_ptr<Engine> (*make)(const std::string &place);
     std::unique_ptr<Catalogue> (*openCatalogue)(const std::string &place);
+    std::int64_t (*schemaVersion)(const std::string &place);
+    std::unique_ptr<Snapshot> (*openSnapshot)(const std::string &place);
+    std::unique_ptr<Replacement> (*openReplacement)(const std::string &place);
 };
 
 constexpr std::array kEngines = {
-    EngineKind{"sqlite:", sqlite::makeEngine, sqlite::openCatalogue},
-    EngineKind{"postgresql:", postgresql::makeEngine, postgresql::openCatalogue},
+    EngineKind{"sqlite:", sqlite::makeEngine, sqlite::openCatalogue, sqlite::schemaVersion,
+               sqlite::openSnapshot, sqlite::openReplacement},
+    EngineKind{"postgresql:", postgresql::makeEngine, postgresql::openCatalogue,
+               postgresql::schemaVersion, postgresql::openSnapshot, postgresql::openReplacement},
 };
 
 /* The engine that a location names, and the location without the engine's name. */
@@ -41,8 +46,8 @@ std::pair<const EngineKind *, std::string> engineOf(const std::string &location)
         }
     }
     throw DatabaseError(KLIB_ERR_BAD_CONFIGURATION,
-                        "the setting mediadb is neither \"sqlite:\" and an absolute path nor a "
-                        "\"postgresql://\" address: " +
+                        "the media database (setting mediadb) is neither \"sqlite:\" and an "
+                        "absolute path nor a \"postgresql://\" address: " +
                             withoutPassword(location, location));
 }
 
@@ -128,24 +133,6 @@ struct Held {
     std::unique_ptr<Cursor> cursor;  // ends before its engine
 };
 
-/* The border: runs `action` and turns what it throws into the error of this thread. */
-template <typename Action>
-int guarded(Action action) noexcept {
-    try {
-        clearError();
-        return action();
-    } catch (const DatabaseError &error) {
-        setError(error.code(), error.what());
-    } catch (const QueryError &error) {
-        setError(KLIB_ERR_DATABASE_QUERY, error.what());
-    } catch (const std::bad_alloc &) {
-        setError(KLIB_ERR_OUT_OF_MEMORY, "out of memory in the media database");
-    } catch (const std::exception &error) {
-        setError(KLIB_ERR_DATABASE_FAILED, error.what());
-    }
-    return -1;
-}
-
 int clampedToInt(std::int64_t count) {
     return static_cast<int>(std::min<std::int64_t>(count, INT32_MAX));
 }
@@ -208,6 +195,21 @@ std::unique_ptr<Catalogue> openCatalogue() {
 std::unique_ptr<Catalogue> openCatalogue(const std::string &location) {
     const auto [kind, place] = engineOf(location);
     return kind->openCatalogue(place);
+}
+
+std::int64_t schemaVersion(const std::string &location) {
+    const auto [kind, place] = engineOf(location);
+    return kind->schemaVersion(place);
+}
+
+std::unique_ptr<Snapshot> openSnapshot(const std::string &location) {
+    const auto [kind, place] = engineOf(location);
+    return kind->openSnapshot(place);
+}
+
+std::unique_ptr<Replacement> openReplacement(const std::string &location) {
+    const auto [kind, place] = engineOf(location);
+    return kind->openReplacement(place);
 }
 
 }  // namespace zano::mediadb

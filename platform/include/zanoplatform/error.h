@@ -18,7 +18,8 @@ enum {
     KLIB_ERR_DATABASE_QUERY = 0x1002,   /* text that is not a valid query */
     KLIB_ERR_DATABASE_TIMEOUT = 0x1003, /* the time limit of a query ran out */
     KLIB_ERR_DATABASE_BUSY = 0x1004,    /* another program is writing */
-    KLIB_ERR_DATABASE_FAILED = 0x1005   /* any other failure of the engine */
+    KLIB_ERR_DATABASE_FAILED = 0x1005,  /* any other failure of the engine */
+    KLIB_ERR_DATABASE_FILLED = 0x1006   /* it holds rows that were not to be replaced */
 };
 
 /* The code of the last failure in this thread. Calls of the media database, the playlist parser,

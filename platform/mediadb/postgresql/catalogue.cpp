@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "../query/statements.h"
+#include "check.h"
 #include "engine.h"
 #include "plan.h"
 #include "songs.h"
@@ -26,13 +27,6 @@ constexpr std::int64_t kRecountShare = 5;
 constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
 constexpr const char *kUnlockAnchors = "SELECT pg_advisory_unlock(1517118562, 2)";
 constexpr const char *kSnapshot = "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ";
-
-/* While another program makes indexes or writes a batch. */
-constexpr const char *kPatience = "SET lock_timeout='15min'";
-/* Several programs write at once, perhaps the same songs and always the same counts. So that they
- * never wait for each other in a circle, a batch is written in one go, under a lock on this row,
- * which any engine has. */
-constexpr const char *kLockWriting = "SELECT value FROM state WHERE name='generation' FOR UPDATE";
 
 class PostgresqlCatalogue : public Catalogue {
   public:
@@ -165,10 +159,10 @@ class PostgresqlCatalogue : public Catalogue {
         return paths;
     }
 
-    void finish(const Progress &progress) override {
+    bool finish(const Progress &progress) override {
         const bool isIndexed = state("indexed") != 0;
         if (isIndexed && state("anchored") == state("generation")) {
-            return;
+            return false;
         }
         connection_.run(std::string(kLockAnchors));
         try {
@@ -186,6 +180,7 @@ class PostgresqlCatalogue : public Catalogue {
         }
         connection_.run(std::string(kUnlockAnchors));
         refreshStatistics();
+        return true;
     }
 
     std::int64_t songCount() override { return state("songs"); }
@@ -209,8 +204,7 @@ class PostgresqlCatalogue : public Catalogue {
     void check() override {
         open(kSnapshot);
         try {
-            checkCounts();
-            checkKeys();
+            checkDatabase(connection_);
         } catch (...) {
             rollback();
             throw;
@@ -392,50 +386,6 @@ class PostgresqlCatalogue : public Catalogue {
                 connection_.run(std::string("ANALYZE"));  // of an engine that has nothing to vacuum
             }
             setState("counted", songs);
-        }
-    }
-
-    [[noreturn]] static void damaged(const std::string &how) {
-        throw DatabaseError(KLIB_ERR_DATABASE_FAILED, "the media database is damaged: " + how);
-    }
-
-    void checkCounts() {
-        if (connection_.integer(newSql("SELECT count(*) FROM songs")) != state("songs")) {
-            damaged("the number of songs is not the one on record");
-        }
-        for (const Facet &facet : facets()) {
-            const std::string kept =
-                "SELECT key, name, songs FROM facets WHERE facet=" + std::to_string(facet.number);
-            std::string real = "SELECT ";
-            real.append(columnInfo(facet.column).key).append(", ");
-            real.append(columnInfo(facet.column).name)
-                .append(", count(*) FROM songs GROUP BY 1, 2");
-            std::string differences = "SELECT count(*) FROM ((";
-            differences.append(kept).append(" EXCEPT ").append(real).append(") UNION ALL (");
-            differences.append(real).append(" EXCEPT ").append(kept).append(")) AS differences");
-            const std::string count = "SELECT count(*) FROM (" + kept + ") AS kept";
-            if (connection_.integer(newSql(differences)) != 0 ||
-                connection_.integer(newSql(count)) != state(std::string(facet.state))) {
-                damaged("the " + std::string(facet.state) +
-                        " on record are not those of the songs");
-            }
-        }
-    }
-
-    /* The keys are what searches and orders go by. */
-    void checkKeys() {
-        connection_.run(
-            newSql("DECLARE files NO SCROLL CURSOR FOR SELECT path, title, album, artist, genre, "
-                   "album_artist, path_key, title_key, album_key, artist_key, genre_key, "
-                   "album_artist_key FROM songs"));
-        for (Result rows = nextFiles(); rows.size() > 0; rows = nextFiles()) {
-            for (int i = 0; i < rows.size(); ++i) {
-                for (int column = 0; column < 6; ++column) {
-                    if (foldedKey(rows[i].text(column)) != rows[i].text(column + 6)) {
-                        damaged("a song has a key that is not its own");
-                    }
-                }
-            }
         }
     }
 

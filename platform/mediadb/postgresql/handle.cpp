@@ -17,6 +17,9 @@ namespace zano::mediadb::postgresql {
 namespace {
 
 constexpr size_t kMaxStatements = 64;
+/* What would end a value or a row, and the letters that stand for it behind a backslash. */
+constexpr std::string_view kCopyEscapes = "\\\t\n\r";
+constexpr std::string_view kCopyLetters = "\\tnr";
 constexpr Oid kBytes = 17;
 constexpr Oid kInt8 = 20;
 constexpr Oid kInt2 = 21;
@@ -74,23 +77,6 @@ std::string textOf(double value) {
     return {digits.data(), end};
 }
 
-/* The server takes no bytes that are not UTF-8. No stored text has them, so they become a character
- * that none has either and that sorts behind all others, as such bytes do. */
-std::string validText(std::string_view text) {
-    if (isUtf8(text)) {
-        return std::string(text);
-    }
-    constexpr std::string_view kLastCharacter = "\xF4\x8F\xBF\xBF";
-    std::string valid;
-    while (!text.empty()) {
-        const std::string_view before = text;
-        takeCharacter(text);
-        const std::string_view taken = before.substr(0, before.size() - text.size());
-        valid.append(isUtf8(taken) ? taken : kLastCharacter);
-    }
-    return valid;
-}
-
 std::string parameterText(const Value &value, Oid type) {
     if (const auto *text = std::get_if<std::string>(&value)) {
         return type == kBytes ? *text : validText(*text);
@@ -118,8 +104,53 @@ Sql newSql(std::string_view text) {
     return sql;
 }
 
+std::string validText(std::string_view text) {
+    if (isUtf8(text)) {
+        return std::string(text);
+    }
+    constexpr std::string_view kLastCharacter = "\xF4\x8F\xBF\xBF";
+    std::string valid;
+    while (!text.empty()) {
+        const std::string_view before = text;
+        takeCharacter(text);
+        const std::string_view taken = before.substr(0, before.size() - text.size());
+        valid.append(isUtf8(taken) ? taken : kLastCharacter);
+    }
+    return valid;
+}
+
 void ArrayText::add(double value) {
     next().append(textOf(value));
+}
+
+void CopyText::add(double value) {
+    next().append(textOf(value));
+}
+
+void CopyText::add(std::string_view value) {
+    std::string &text = next();
+    for (const char c : validText(value)) {
+        const size_t escape = kCopyEscapes.find(c);
+        if (escape == std::string_view::npos) {
+            text += c;
+        } else {
+            text.append("\\").append(1, kCopyLetters[escape]);
+        }
+    }
+}
+
+void CopyText::addPath(std::string_view value) {
+    constexpr std::string_view kDigits = "0123456789abcdef";
+    std::string &text = next().append("\\\\x");
+    for (const char c : value) {
+        const auto byte = static_cast<unsigned char>(c);
+        text.append(1, kDigits[byte >> 4U]).append(1, kDigits[byte & 15U]);
+    }
+}
+
+void CopyText::endRow() {
+    text_ += '\n';
+    isFirst_ = true;
 }
 
 std::int64_t Row::integer(int column) const {
@@ -225,6 +256,10 @@ Result Connection::checked(PGresult *made) {
     if (status == PGRES_COMMAND_OK || status == PGRES_TUPLES_OK) {
         return result;
     }
+    throwErrorOf(made);
+}
+
+void Connection::throwErrorOf(const PGresult *made) {
     plan_.reset();  // a transaction that fails takes settings back
     const char *state =
         made != nullptr ? libpq().resultErrorField(made, PG_DIAG_SQLSTATE) : nullptr;
@@ -248,6 +283,33 @@ void Connection::usePlan(Plan plan) {
 void Connection::runLater(const char *sql) {
     if (libpq().sendQuery(connection_.get(), sql) == 0) {
         checked(nullptr);
+    }
+}
+
+void Connection::beginCopy(const char *sql) {
+    Result result(libpq().exec(connection_.get(), sql));
+    if (libpq().resultStatus(result.get()) != PGRES_COPY_IN) {
+        throwErrorOf(result.get());
+    }
+}
+
+void Connection::sendRows(std::string_view rows) {
+    if (libpq().putCopyData(connection_.get(), rows.data(), static_cast<int>(rows.size())) != 1) {
+        throwErrorOf(nullptr);
+    }
+}
+
+/* The connection is of use again only when all results were taken. */
+void Connection::endCopy() {
+    if (libpq().putCopyEnd(connection_.get(), nullptr) != 1) {
+        throwErrorOf(nullptr);
+    }
+    Result result(libpq().getResult(connection_.get()));
+    while (PGresult *more = libpq().getResult(connection_.get())) {
+        libpq().clear(more);
+    }
+    if (libpq().resultStatus(result.get()) != PGRES_COMMAND_OK) {
+        throwErrorOf(result.get());
     }
 }
 

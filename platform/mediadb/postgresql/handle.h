@@ -8,6 +8,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "../catalogue.h"
@@ -75,6 +76,26 @@ class ArrayText {
     std::string text_;
 };
 
+/* The server takes no bytes that are not UTF-8. No stored text has them, so they become a character
+ * that none has either and that sorts behind all others, as such bytes do. */
+std::string validText(std::string_view text);
+
+/* Rows in text form, as COPY takes them. */
+class CopyText {
+  public:
+    void add(std::int64_t value) { next().append(std::to_string(value)); }
+    void add(double value);
+    void add(std::string_view value);
+    void addPath(std::string_view value);
+    void endRow();
+    std::string &text() { return text_; }
+
+  private:
+    std::string &next() { return text_.append(std::exchange(isFirst_, false) ? "" : "\t"); }
+    bool isFirst_ = true;  // of its row
+    std::string text_;
+};
+
 class Connection {
   public:
     /* For writing, the primary among several hosts. */
@@ -94,6 +115,12 @@ class Connection {
     }
     /* Without waiting for the end of it, or ever looking at it; the next statement waits. */
     void runLater(const char *sql);
+    /* "COPY table(columns) FROM STDIN", any number of rows for it, and their end. What the server
+     * refuses fails at the end at the latest, and the transaction with it. Another statement in the
+     * place of the end gives the rows up. */
+    void beginCopy(const char *sql);
+    void sendRows(std::string_view rows);
+    void endCopy();
     /* So that a text that the server refuses fails before it is run. */
     void check(const Sql &sql) { prepare(sql.text()); }
     /* Under which the server knows a statement from now until the next one is prepared. */
@@ -117,6 +144,7 @@ class Connection {
     Result execute(const Prepared &statement, const std::vector<Value> &values);
     void usePlan(Plan plan);
     Result checked(PGresult *result);
+    [[noreturn]] void throwErrorOf(const PGresult *result);
     void applySettings(Access access);
 
     std::unique_ptr<PGconn, Finish> connection_;

@@ -56,6 +56,9 @@ Libpq load() {
     find(library, "PQfformat", made.fformat);
     find(library, "PQftype", made.ftype);
     find(library, "PQntuples", made.ntuples);
+    find(library, "PQputCopyData", made.putCopyData);
+    find(library, "PQputCopyEnd", made.putCopyEnd);
+    find(library, "PQgetResult", made.getResult);
     return made;
 }
 

@@ -31,6 +31,9 @@ struct Libpq {
     decltype(&::PQfformat) fformat;
     decltype(&::PQftype) ftype;
     decltype(&::PQntuples) ntuples;
+    decltype(&::PQputCopyData) putCopyData;
+    decltype(&::PQputCopyEnd) putCopyEnd;
+    decltype(&::PQgetResult) getResult;
 };
 
 /* Throws DatabaseError when the library is not there. It stays until the program ends. */

@@ -84,17 +84,6 @@ void addLowerCase(Connection &connection) {
                           before + " COLLATE pg_catalog.\"und-x-icu\")'", before + ")'"});
 }
 
-/* 0: there is no table. It is looked for in the catalogue: a name may still be taken for free that
- * another program has used while this one waited. */
-std::int64_t versionOf(Connection &connection) {
-    const std::int64_t tables = connection.integer(
-        newSql("SELECT count(*) FROM pg_tables WHERE schemaname='zano' AND tablename='state'"));
-    if (tables == 0) {
-        return 0;
-    }
-    return connection.integer(newSql("SELECT value FROM zano.state WHERE name='schema'"), -1);
-}
-
 void addSearchIndex(Connection &connection) {
     const Result row = connection.run(
         std::string("SELECT quote_ident(nspname) FROM pg_extension JOIN pg_namespace n "
@@ -155,6 +144,17 @@ void migrate(Connection &connection) {
 }
 
 }  // namespace
+
+/* The table is looked for in the catalogue: a name may still be taken for free that
+ * another program has used while this one waited. */
+std::int64_t versionOf(Connection &connection) {
+    const std::int64_t tables = connection.integer(
+        newSql("SELECT count(*) FROM pg_tables WHERE schemaname='zano' AND tablename='state'"));
+    if (tables == 0) {
+        return 0;
+    }
+    return connection.integer(newSql("SELECT value FROM zano.state WHERE name='schema'"), -1);
+}
 
 void requireVersion(std::int64_t version) {
     if (version > kSchemaVersion) {

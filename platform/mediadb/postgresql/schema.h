@@ -13,6 +13,16 @@ namespace zano::mediadb::postgresql {
 
 constexpr std::int64_t kSchemaVersion = 1;
 
+/* Several programs write at once, perhaps the same songs and always the same counts. So that they
+ * never wait for each other in a circle, a batch is written in one go, under a lock on this row,
+ * which any engine has. */
+constexpr const char *kLockWriting = "SELECT value FROM state WHERE name='generation' FOR UPDATE";
+/* How long to wait while another program makes indexes or writes a batch. */
+constexpr const char *kPatience = "SET lock_timeout='15min'";
+
+/* Of the schema of a database; 0 when it has none, -1 when that is not of a media database. */
+std::int64_t versionOf(Connection &connection);
+
 /* Connects to the primary. Missing tables are made and an older schema is migrated, by one program
  * while others wait; a schema of another program or a newer version is left as it is and throws. */
 Connection openForWriting(const std::string &uri);

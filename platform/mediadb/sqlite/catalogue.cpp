@@ -11,6 +11,7 @@
 
 #include "../query/render.h"
 #include "../query/statements.h"
+#include "check.h"
 #include "engine.h"
 #include "grams.h"
 #include "plan.h"
@@ -57,15 +58,6 @@ struct StoredSong {
     }
     std::string document() const { return gramDocument(titleKey, artistKey, albumKey, genreKey); }
 };
-
-/* SQL that counts the rows that only one of two queries gives. */
-std::string differencesOf(const std::string &one, const std::string &other) {
-    std::string sql = "SELECT (SELECT count(*) FROM (";
-    sql.append(one).append(" EXCEPT ").append(other);
-    sql.append(")) + (SELECT count(*) FROM (");
-    sql.append(other).append(" EXCEPT ").append(one).append("))");
-    return sql;
-}
 
 class SqliteCatalogue : public Catalogue {
   public:
@@ -232,9 +224,9 @@ class SqliteCatalogue : public Catalogue {
         return paths;
     }
 
-    void finish(const Progress &progress) override {
+    bool finish(const Progress &progress) override {
         if (state("ordered") != 0 && state("anchored") == state("generation")) {
-            return;
+            return false;
         }
         begin();
         try {
@@ -244,6 +236,7 @@ class SqliteCatalogue : public Catalogue {
             throw;
         }
         connection_.run("PRAGMA wal_checkpoint(PASSIVE)");
+        return true;
     }
 
     std::int64_t songCount() override {
@@ -267,20 +260,8 @@ class SqliteCatalogue : public Catalogue {
     }
 
     void check() override {
-        Statement result = prepare("PRAGMA integrity_check");
-        if (result.step() && result.text(0) != "ok") {
-            damaged(std::string(result.text(0)));
-        }
-        result.reset();
-        if (connection_.integer("SELECT count(*) FROM songs") != songCount()) {
-            damaged("the number of songs is not the one on record");
-        }
-        if (state("ordered") != 0) {
-            checkOrder(tailOrder());
-            checkOrder(titleOrder());
-            checkFacets();
-            checkGrams();
-        }
+        const Transaction moment(connection_, "BEGIN");
+        checkDatabase(connection_);
     }
 
   private:
@@ -296,10 +277,6 @@ class SqliteCatalogue : public Catalogue {
     }
 
     Statement prepare(std::string_view sql) { return connection_.prepare(sql, true); }
-
-    [[noreturn]] static void damaged(const std::string &how) {
-        throw DatabaseError(KLIB_ERR_DATABASE_FAILED, "the media database is damaged: " + how);
-    }
 
     std::int64_t state(std::string_view name) {
         Using row(getState_);
@@ -403,12 +380,7 @@ class SqliteCatalogue : public Catalogue {
     }
 
     void dropOrders() {
-        for (const std::string &statement : dropIndexes()) {
-            connection_.run(statement);
-        }
-        connection_.run("INSERT INTO grams(grams) VALUES('delete-all')");
-        connection_.run("DELETE FROM facets");
-        connection_.run("DELETE FROM anchors");
+        dropOrdersOf(connection_);
         pending_.clear();
         gramsToDrop_.clear();
         facetCounts_.clear();
@@ -537,10 +509,7 @@ class SqliteCatalogue : public Catalogue {
         connection_.run("DELETE FROM anchors");
         Statement insert = prepare("INSERT INTO anchors VALUES(?1, ?2, ?3)");
         for (const StoredOrder &order : storedOrders()) {
-            const std::string by =
-                order.index.empty() ? "" : " INDEXED BY " + std::string(order.index);
-            Statement songs =
-                prepare("SELECT id FROM songs" + by + " ORDER BY " + orderText(order, ""));
+            Statement songs = prepare(orderedIds(order));
             for (std::int64_t at = 0; songs.step(); ++at) {
                 if (at % kAnchorDistance == 0) {
                     insert.bind(1, order.number).bind(2, at / kAnchorDistance);
@@ -550,70 +519,6 @@ class SqliteCatalogue : public Catalogue {
         }
         setState("anchored", state("generation") + 1);
         isChanged_ = true;
-    }
-
-    void checkOrder(const RankedOrder &order) {
-        const std::string column(order.column);
-        if (connection_.integer("SELECT count(*) FROM songs WHERE " + column + " IS NULL") != 0) {
-            damaged("a song has no " + column);
-        }
-        Statement rows =
-            prepare("SELECT " + std::string(songKeyColumns()) + " FROM songs ORDER BY " + column);
-        SongKey previous;
-        bool isFirst = true;
-        while (rows.step()) {
-            SongKey key = readSongKey(rows, 0);
-            if (!isFirst && !order.isBefore(previous, key)) {
-                damaged("song " + std::to_string(key.id) + " is out of order by " + column);
-            }
-            previous = std::move(key);
-            isFirst = false;
-        }
-    }
-
-    void checkFacets() {
-        for (const Facet &facet : facets()) {
-            const ColumnInfo &info = columnInfo(facet.column);
-            const std::string number = std::to_string(facet.number);
-            const std::string kept = "SELECT key, name, songs FROM facets WHERE facet=" + number;
-            std::string real = "SELECT ";
-            real.append(info.key).append(", ").append(info.name);
-            real.append(", count(*) FROM songs GROUP BY 1, 2");
-            const std::string differences = differencesOf(kept, real);
-            if (connection_.integer(differences) != 0 ||
-                connection_.integer("SELECT count(*) FROM facets WHERE facet=" + number) !=
-                    state(facet.state)) {
-                damaged("the " + std::string(facet.state) +
-                        " on record are not those of the songs");
-            }
-        }
-    }
-
-    /* Builds the index once more beside the real one and compares their words. */
-    void checkGrams() {
-        connection_.run("INSERT INTO grams(grams) VALUES('integrity-check')");
-        connection_.run(
-            "CREATE VIRTUAL TABLE temp.other_grams USING fts5(document, content='', detail=none, "
-            "columnsize=0, tokenize='zanograms')");
-        connection_.run("CREATE VIRTUAL TABLE temp.kept USING fts5vocab(main, grams, instance)");
-        connection_.run(
-            "CREATE VIRTUAL TABLE temp.real USING fts5vocab(temp, other_grams, instance)");
-        Statement rows = prepare(
-            "SELECT rank, title_key, artist_key, album_key, genre_key FROM songs ORDER BY 1");
-        Statement add = prepare("INSERT INTO temp.other_grams(rowid, document) VALUES(?1, ?2)");
-        while (rows.step()) {
-            const std::string document =
-                gramDocument(rows.text(1), rows.text(2), rows.text(3), rows.text(4));
-            add.bind(1, rows.integer(0)).bind(2, std::string_view(document)).run();
-        }
-        const std::int64_t differences = connection_.integer(
-            differencesOf("SELECT term, doc FROM temp.kept", "SELECT term, doc FROM temp.real"));
-        connection_.run("DROP TABLE temp.kept");
-        connection_.run("DROP TABLE temp.real");
-        connection_.run("DROP TABLE temp.other_grams");
-        if (differences != 0) {
-            damaged("the search index is not that of the songs");
-        }
     }
 
     Connection connection_;

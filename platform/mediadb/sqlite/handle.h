@@ -84,4 +84,28 @@ class Connection {
     std::unique_ptr<sqlite3, Close> database_;
 };
 
+/* Undone at its end unless committed, with the temporary tables that were made meanwhile. */
+class Transaction {
+  public:
+    /* begin: "BEGIN" of one moment to read, or "BEGIN IMMEDIATE" to write. */
+    Transaction(Connection &connection, const std::string &begin) : connection_(connection) {
+        connection.run(begin);
+    }
+    ~Transaction() {
+        if (isOpen_) {
+            sqlite3_exec(connection_.get(), "ROLLBACK", nullptr, nullptr, nullptr);
+        }
+    }
+    Transaction(const Transaction &) = delete;
+    Transaction &operator=(const Transaction &) = delete;
+    void commit() {
+        connection_.run("COMMIT");
+        isOpen_ = false;
+    }
+
+  private:
+    Connection &connection_;
+    bool isOpen_ = true;
+};
+
 }  // namespace zano::mediadb::sqlite

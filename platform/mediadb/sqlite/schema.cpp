@@ -247,6 +247,21 @@ Connection prepareForWriting(Connection connection, const std::string &path) {
     return connection;
 }
 
+/* What the file says is as it may be, but the schema may be an older one. */
+Connection readOnly(const std::string &path) {
+    Connection connection(path, Connection::Mode::ReadOnly);
+    prepareForUse(connection);
+    namingFile(path, [&] { checkVersion(connection, path); });
+    return connection;
+}
+
+void requireVersion(Connection &connection, const std::string &path) {
+    if (connection.integer("PRAGMA user_version") != kSchemaVersion) {
+        throw DatabaseError(KLIB_ERR_DATABASE_VERSION,
+                            path + " has an older schema; zanoindex brings it up to date");
+    }
+}
+
 }  // namespace
 
 Connection openForWriting(const std::string &path) {
@@ -258,16 +273,21 @@ Connection openExistingForWriting(const std::string &path) {
     return prepareForWriting(Connection(path, Connection::Mode::ReadWrite), path);
 }
 
+std::int64_t versionOf(const std::string &path) {
+    return readOnly(path).integer("PRAGMA user_version");
+}
+
+Connection openWhole(const std::string &path) {
+    Connection connection = readOnly(path);
+    requireVersion(connection, path);
+    connection.run("PRAGMA cache_size=-16384");
+    connection.run("PRAGMA temp_store=FILE");
+    return connection;
+}
+
 Connection openForReading(const std::string &path) {
-    Connection connection(path, Connection::Mode::ReadOnly);
-    prepareForUse(connection);
-    namingFile(path, [&] {
-        checkVersion(connection, path);
-        if (connection.integer("PRAGMA user_version") != kSchemaVersion) {
-            throw DatabaseError(KLIB_ERR_DATABASE_VERSION,
-                                path + " has an older schema; zanoindex brings it up to date");
-        }
-    });
+    Connection connection = readOnly(path);
+    requireVersion(connection, path);
     connection.run("PRAGMA query_only=ON");
     connection.run("PRAGMA cache_size=-16384");
     connection.run("PRAGMA mmap_size=" + std::to_string(kMappedBytes));
@@ -322,14 +342,23 @@ std::string orderText(const StoredOrder &order, std::string_view qualifier) {
     return text.append(qualifier).append(order.tail).append(direction);
 }
 
-std::vector<std::string> dropIndexes() {
-    std::vector<std::string> statements;
+std::string orderedIds(const StoredOrder &order) {
+    std::string sql = "SELECT id FROM songs";
+    if (!order.index.empty()) {
+        sql.append(" INDEXED BY ").append(order.index);
+    }
+    return sql.append(" ORDER BY ").append(orderText(order, ""));
+}
+
+void dropOrdersOf(Connection &connection) {
     for (const StoredOrder &order : storedOrders()) {
         if (order.leading.column != Column::Path && !order.index.empty()) {
-            statements.push_back("DROP INDEX IF EXISTS " + std::string(order.index));
+            connection.run("DROP INDEX IF EXISTS " + std::string(order.index));
         }
     }
-    return statements;
+    connection.run("INSERT INTO grams(grams) VALUES('delete-all')");
+    connection.run("DELETE FROM facets");
+    connection.run("DELETE FROM anchors");
 }
 
 std::vector<std::string> createIndexes() {

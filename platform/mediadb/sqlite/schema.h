@@ -30,6 +30,12 @@ Connection openExistingForWriting(const std::string &path);
  * functions. Throws as above, and when the file is missing. */
 Connection openForReading(const std::string &path);
 
+/* The same, but all may be read, and temporary tables be made. */
+Connection openWhole(const std::string &path);
+
+/* Of the schema of an existing file. Throws as openForReading(), but not when it is older. */
+std::int64_t versionOf(const std::string &path);
+
 /* An order that is read from an index. */
 struct StoredOrder {
     OrderTerm leading;
@@ -45,8 +51,14 @@ const StoredOrder *findStoredOrder(const OrderTerm &leading);
 /* "key DESC, tail DESC", with a qualifier such as "songs." before each. */
 std::string orderText(const StoredOrder &order, std::string_view qualifier);
 
-/* SQL that drops, and SQL that makes, all indexes of the stored orders but that over paths. */
-std::vector<std::string> dropIndexes();
+/* SQL for the ids of all songs in a stored order, from its index. */
+std::string orderedIds(const StoredOrder &order);
+
+/* Takes away what a first scan makes at its end: the indexes of the stored orders but that over
+ * paths, the search index, the counted values, the anchors. */
+void dropOrdersOf(Connection &connection);
+
+/* SQL that makes those indexes. */
 std::vector<std::string> createIndexes();
 
 }  // namespace zano::mediadb::sqlite
