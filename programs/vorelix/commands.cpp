@@ -1,5 +1,6 @@
 #include "commands.h"
 
+#include "db_options.h"
 #include "state_options.h"
 #include "upnp_options.h"
 
@@ -79,6 +80,14 @@ const std::vector<Command> &allCommands() {
          addMediaServer},
         {"upnp tree", "Show the containers of a media server with all that is below them", 0,
          upnpTreeCommand, addMediaTree},
+#ifdef VORELIX_DATABASE_UPKEEP
+        {"db", "Check, bring up to date and copy media databases", 0, nullptr},
+        {"db check", "Say whether a media database is sound", 0, dbCheckCommand, addDatabase},
+        {"db migrate", "Bring a media database of an older version up to date", 0, dbMigrateCommand,
+         addDatabase},
+        {"db copy", "Copy a media database to another place, of another engine perhaps", 0,
+         dbCopyCommand, addDatabases},
+#endif
     };
     return commands;
 }

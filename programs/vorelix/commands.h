@@ -95,4 +95,13 @@ Outcome upnpBrowseCommand(const Request &request, const Terminal &terminal);
 Outcome upnpCapsCommand(const Request &request, const Terminal &terminal);
 Outcome upnpTreeCommand(const Request &request, const Terminal &terminal);
 
+/* Of whole media databases; built where the platform library is the bundled one:
+ *   check     {"location", "songs", "playlists", "notices", "isIndexed"}
+ *   migrate   {"location", "schemaBefore", "schema", "changed"}
+ *   copy      {"from", "to", "songs", "playlists", "notices"}
+ * A database that is damaged is a failure. */
+Outcome dbCheckCommand(const Request &request, const Terminal &terminal);
+Outcome dbMigrateCommand(const Request &request, const Terminal &terminal);
+Outcome dbCopyCommand(const Request &request, const Terminal &terminal);
+
 }  // namespace vorelix

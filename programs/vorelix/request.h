@@ -104,6 +104,14 @@ struct UpnpRequest {
     std::string interface;  // name or address; "": as the system chooses
 };
 
+/* Which media databases db commands were given, as the setting mediadb names them. */
+struct DatabaseRequest {
+    std::string location;  // "": that of the setting
+    std::string from;
+    std::string to;
+    bool force = false;
+};
+
 struct Request {
     const Command *command = nullptr;
     std::vector<std::string> words;  // the whole command line as it was typed
@@ -119,6 +127,7 @@ struct Request {
     UsersRequest users;
     StateRequest state;
     UpnpRequest upnp;
+    DatabaseRequest database;
 };
 
 }  // namespace vorelix

@@ -33,6 +33,7 @@ constexpr std::array kPhases = {
     PhaseRow{Phase::kLooking, "looking for files", "files", true},
     PhaseRow{Phase::kReading, "reading tags", "files", true},
     PhaseRow{Phase::kIndexing, "updating orders and search", "steps", false},
+    PhaseRow{Phase::kCopying, "copying", "rows", true},
 };
 
 const PhaseRow &rowOf(Phase phase) {
@@ -78,7 +79,8 @@ std::string progressText(const PhaseState &state) {
         return text;
     }
     const double rate = static_cast<double>(state.done) / state.seconds;
-    text += ", " + std::to_string(std::llround(rate)) + " files/s";
+    text += ", " + std::to_string(std::llround(rate)) + " ";
+    text.append(row.unit).append("/s");
     if (state.total > state.done) {
         text += ", " + clockText(static_cast<double>(state.total - state.done) / rate) + " left";
     }

@@ -1,5 +1,5 @@
-/* What the user sees while the indexer works: a bar on a terminal, lines at intervals elsewhere,
- * on standard error; and messages between them. */
+/* What the user sees while the indexer, or another program, works: a bar on a terminal, lines at
+ * intervals elsewhere, on standard error; and messages between them. */
 #pragma once
 
 #include <chrono>
@@ -11,7 +11,7 @@ namespace zano::index {
 
 enum class ProgressStyle : std::uint8_t { kNone, kLines, kBar };
 
-enum class Phase : std::uint8_t { kLooking, kReading, kIndexing };
+enum class Phase : std::uint8_t { kLooking, kReading, kIndexing, kCopying };
 
 /* How far a phase is. total 0: not known. */
 struct PhaseState {
