@@ -251,7 +251,17 @@ Connection prepareForWriting(Connection connection, const std::string &path) {
 Connection readOnly(const std::string &path) {
     Connection connection(path, Connection::Mode::ReadOnly);
     prepareForUse(connection);
-    namingFile(path, [&] { checkVersion(connection, path); });
+    try {
+        namingFile(path, [&] { checkVersion(connection, path); });
+    } catch (const DatabaseError &error) {
+        if ((sqlite3_errcode(connection.get()) & 0xFF) != SQLITE_READONLY) {
+            throw;
+        }
+        throw DatabaseError(error.code(), path +
+                                              " can be read only with its files -wal and -shm "
+                                              "beside it, which the next run of a user who may "
+                                              "write in its folder makes");
+    }
     return connection;
 }
 
