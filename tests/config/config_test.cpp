@@ -1,8 +1,9 @@
 #include <sys/stat.h>
 #include <vorelix/config/config.h>
 
-#include <filesystem>
+#include <map>
 #include <string>
+#include <vector>
 
 #include "config/line_internal.h"
 #include "support/files.h"
@@ -47,44 +48,29 @@ class Configuration : public stand_in::Test {
 };
 
 TEST(ConfigurationLine, IsTakenApart) {
-    const struct {
-        const char *line;
-        const char *read;
-    } cases[] = {
-        {"a=\"b\"\n", "a|b"},
-        {"a = \"b\"", "a|b"},
-        {" \ta\t=\t\"b\" \t\n", "a|b"},
-        {"a=b c\n", "a|b c"},
-        {"a b=c", "a b|c"},
-        {"a=\" b \"\n", "a| b "},
-        {"a=\"b=\"c\"\"\n", "a|b=\"c\""},
-        {"a=\"b\n", "a|\"b"},
-        {"a=b\"\n", "a|b\""},
-        {"a=\"\n", "a|"},
-        {"a=\"\"\n", "a|"},
-        {"a=\"\"\"\n", "a|\""},
-        {"a== = b\n", "a|b"},
-        {"a=\"b\"\r\n", "a|\"b\"\r"},
-        {"a=# b\n", "a|# b"},
-        {"a=\n", "a|"},
-        {"a= \t", "a|"},
-        {"a\n", "a|"},
-        {"a", "a|"},
-        {"a b \t\n", "a b|"},
-        {"=b\n", "|b"},
-        {" ==\"b\"\n", "|b"},
-        {"=", "|"},
-        {"\r\n", "\r|"},
-        {"\"a\"=1\n", "\"a\"|1"},
-        {"# a=b\n", ""},
-        {"  #", ""},
-        {"\n", ""},
-        {" \t\n", ""},
-        {" \t", ""},
-        {"", ""},
+    const std::map<std::string, std::vector<const char *>> linesOf = {
+        {"a|b", {"a=\"b\"\n", "a = \"b\"", " \ta\t=\t\"b\" \t\n", "a== = b\n"}},
+        {"a|b c", {"a=b c\n"}},
+        {"a b|c", {"a b=c"}},
+        {"a| b ", {"a=\" b \"\n"}},
+        {"a|b=\"c\"", {"a=\"b=\"c\"\"\n"}},
+        {"a|\"b", {"a=\"b\n"}},
+        {"a|b\"", {"a=b\"\n"}},
+        {"a|", {"a=\"\n", "a=\"\"\n", "a=\n", "a= \t", "a\n", "a"}},
+        {"a|\"", {"a=\"\"\"\n"}},
+        {"a|\"b\"\r", {"a=\"b\"\r\n"}},
+        {"a|# b", {"a=# b\n"}},
+        {"a b|", {"a b \t\n"}},
+        {"|b", {"=b\n", " ==\"b\"\n"}},
+        {"|", {"="}},
+        {"\r|", {"\r\n"}},
+        {"\"a\"|1", {"\"a\"=1\n"}},
+        {"", {"# a=b\n", "  #", "\n", " \t\n", " \t", ""}},
     };
-    for (const auto &each : cases) {
-        EXPECT_EQ(split(each.line), each.read) << each.line;
+    for (const auto &[read, lines] : linesOf) {
+        for (const char *line : lines) {
+            EXPECT_EQ(split(line), read) << line;
+        }
     }
 }
 

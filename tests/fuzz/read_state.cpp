@@ -32,10 +32,17 @@ void fortifiedSyslog(int, int, const char *, ...) {}
 namespace vorelix::fuzz {
 namespace {
 
-/* A file in memory. */
+/* A file in memory, to which a fixed path of the device may lead. */
 class MemoryFile {
   public:
-    MemoryFile() : descriptor_(memfd_create("input", 0)) { require(descriptor_ != -1); }
+    explicit MemoryFile(const char *fixed = nullptr) : descriptor_(memfd_create("input", 0)) {
+        require(descriptor_ != -1);
+        if (fixed != nullptr) {
+            std::filesystem::create_directories(std::filesystem::path(fixed).parent_path());
+            std::filesystem::remove(fixed);
+            std::filesystem::create_symlink(path(), fixed);
+        }
+    }
     ~MemoryFile() { close(descriptor_); }
     MemoryFile(const MemoryFile &) = delete;
     MemoryFile &operator=(const MemoryFile &) = delete;
@@ -57,13 +64,6 @@ class MemoryFile {
   private:
     int descriptor_;
 };
-
-/* Leads a fixed path of the device to a file. */
-void lead(const char *path, const std::string &target) {
-    std::filesystem::create_directories(std::filesystem::path(path).parent_path());
-    std::filesystem::remove(path);
-    std::filesystem::create_symlink(target, path);
-}
 
 template <std::size_t Size>
 void requireText(const char (&text)[Size]) {
@@ -119,10 +119,9 @@ void readAsQueue(const std::uint8_t *bytes, std::size_t size) {
 }
 
 void readAsTrackList(const std::uint8_t *bytes, std::size_t size) {
-    static const MemoryFile kInput;
+    static const MemoryFile kInput(ZANO_PATH_IPOD_FOLDER "tracks.m3u");
     static const bool kIsReady = [] {
         std::filesystem::remove(ZANO_PATH_AUDIO_CONF);
-        lead(ZANO_PATH_IPOD_FOLDER "tracks.m3u", kInput.path());
         return ZANOSonmiraRestoreConf() == 1;
     }();
     require(kIsReady);
@@ -145,12 +144,7 @@ void readAsTrackList(const std::uint8_t *bytes, std::size_t size) {
 }
 
 void readAsConfiguration(const std::uint8_t *bytes, std::size_t size) {
-    static const MemoryFile kInput;
-    static const bool kIsReady = [] {
-        lead(ZANO_PATH_AUDIO_CONF, kInput.path());
-        return true;
-    }();
-    require(kIsReady);
+    static const MemoryFile kInput(ZANO_PATH_AUDIO_CONF);
     kInput.write(bytes, size);
     ZANO_AUDIO_CONF conf{};
     require(ZANOAudioConfGetALL(&conf) == 1);
@@ -183,12 +177,7 @@ void readAsUsers(const std::uint8_t *bytes, std::size_t size) {
 }
 
 void readAsCustomKeys(const std::uint8_t *bytes, std::size_t size) {
-    static const MemoryFile kInput;
-    static const bool kIsReady = [] {
-        lead(ZANO_PATH_CUSTOM_KEYS, kInput.path());
-        return true;
-    }();
-    require(kIsReady);
+    static const MemoryFile kInput(ZANO_PATH_CUSTOM_KEYS);
     const std::string before(reinterpret_cast<const char *>(bytes), size);
     for (const int key : {0, 1, 4}) {
         kInput.write(bytes, size);

@@ -2,11 +2,11 @@
  * folder that goes with it. It ends with the test, however that ends. */
 #pragma once
 
-#include <sys/types.h>
-
+#include <optional>
 #include <string>
 
 #include "support/files.h"
+#include "support/program.h"
 
 namespace integration {
 
@@ -33,7 +33,7 @@ class MiniDlna {
     files::Folder folder_;
     int port_;
     std::string name_;
-    pid_t pid_;
+    std::optional<program::Process> program_;
 };
 
 }  // namespace integration

@@ -47,14 +47,6 @@ std::string text(const stand_in::List &list) {
     return all;
 }
 
-std::string titles(const stand_in::List &list) {
-    std::string all;
-    for (const ZANO_PLAYLIST_REC *node = list.head(); node != nullptr; node = node->next) {
-        all += (all.empty() ? "" : " ") + std::string(node->info.title);
-    }
-    return all;
-}
-
 /* "result: tracks" */
 std::string listed(const std::string &path, int offset = 0, int limit = 0) {
     stand_in::List list;
@@ -152,29 +144,28 @@ TEST_F(IPod, ListsAreCutToPages) {
         int offset;
         int limit;
         const char *listed;
-        const char *page;
-    } cases[] = {{0, 0, "One Two Three", ""},
-                 {1, 1, "Two", "Two\n"},
-                 {1, 0, "Two Three", ""},
-                 {0, 2, "One Two", "One\n Two\n"},
-                 {2, 9, "Three", "Three\n"},
-                 {3, 1, "", ""},
-                 {-5, 1, "One", "One\n"},
-                 {0, -1, "One Two Three", ""},
-                 {0, INT_MIN, "One Two Three", ""},
-                 {INT_MAX, INT_MAX, "", ""},
-                 {INT_MIN, INT_MAX, "One Two Three", "One\n Two\n Three\n"}};
-    for (const auto &each : cases) {
-        SCOPED_TRACE(std::to_string(each.offset) + ", " + std::to_string(each.limit));
+        const char *page = "";
+    } cases[] = {{0, 0, "0 One, 0 Two, 0 Three"},
+                 {1, 1, "0 Two", "0 Two\n"},
+                 {1, 0, "0 Two, 0 Three"},
+                 {0, 2, "0 One, 0 Two", "0 One\n, 0 Two\n"},
+                 {2, 9, "0 Three", "0 Three\n"},
+                 {3, 1, ""},
+                 {-5, 1, "0 One", "0 One\n"},
+                 {0, -1, "0 One, 0 Two, 0 Three"},
+                 {0, INT_MIN, "0 One, 0 Two, 0 Three"},
+                 {INT_MAX, INT_MAX, ""},
+                 {INT_MIN, INT_MAX, "0 One, 0 Two, 0 Three", "0 One\n, 0 Two\n, 0 Three\n"}};
+    for (const auto &[offset, limit, listed, paged] : cases) {
+        SCOPED_TRACE(std::to_string(offset) + ", " + std::to_string(limit));
         stand_in::List list;
-        EXPECT_EQ(ZANOIPodListSongsAll(kTracks.c_str(), list.address(), each.offset, each.limit),
-                  3);
-        EXPECT_EQ(titles(list), each.listed);
+        EXPECT_EQ(ZANOIPodListSongsAll(kTracks.c_str(), list.address(), offset, limit), 3);
+        EXPECT_EQ(list.text(), listed);
         stand_in::List page;
         int total = 0;
-        EXPECT_EQ(ZANOIPodInfoGetAll(page.address(), each.offset, each.limit, &total), 0);
+        EXPECT_EQ(ZANOIPodInfoGetAll(page.address(), offset, limit, &total), 0);
         EXPECT_EQ(total, 3);
-        EXPECT_EQ(titles(page), each.page);
+        EXPECT_EQ(page.text(), paged);
     }
     stand_in::List page;
     EXPECT_EQ(ZANOIPodInfoGetAll(page.address(), 0, 1, nullptr), 0);

@@ -21,57 +21,55 @@ const std::string kDefaultOrder =
 
 class Listing : public stand_in::Test {};
 
-struct ListCase {
-    int category;
-    const char *keyword;
-    const char *sortColumn;
-    int ascending;
-    std::string condition;
-    std::string order;
-};
-
 TEST_F(Listing, TextsThatReachTheDatabase) {
-    const std::string inRoot = "path like '/volume1/music/%'";
-    const std::vector<ListCase> cases = {
-        {0, nullptr, nullptr, 1, "null", kDefaultOrder},
-        {1, "", "", 7, "null", kDefaultOrder},
-        {0, "any", nullptr, 1, "null", kDefaultOrder},
-        {1, "Bob", nullptr, 1, '"' + inRoot + " and title ilike '%Bob%'\"", kDefaultOrder},
-        {2, "Bob", nullptr, 1, '"' + inRoot + " and artist ilike '%Bob%'\"", kDefaultOrder},
-        {3, "Bob", nullptr, 1, '"' + inRoot + " and album ilike '%Bob%'\"", kDefaultOrder},
-        {4, "Bob", nullptr, 1, '"' + inRoot + " and genre ilike '%Bob%'\"", kDefaultOrder},
-        {5, "it's", nullptr, 1,
-         '"' + inRoot +
-             " and (title ilike '%it''s%' or artist ilike '%it''s%' or album ilike '%it''s%' or "
-             "genre ilike '%it''s%')\"",
-         kDefaultOrder},
-        {-1, "x", nullptr, 1, '"' + inRoot + " and  ilike '%x%'\"", kDefaultOrder},
-        {6, "x", nullptr, 1, '"' + inRoot + " and  ilike '%x%'\"", kDefaultOrder},
-        {1, "'\\%_", nullptr, 1, '"' + inRoot + " and title ilike '%''\\\\%_%'\"", kDefaultOrder},
-        {1, "\xFF@ZANO:NEVAR", nullptr, 1, '"' + inRoot + " and title ilike '%\xFF@ZANO:NEVAR%'\"",
-         kDefaultOrder},
-        {0, nullptr, "random", 0, "null", "\"RANDOM()\""},
-        {0, nullptr, "Random", 0, "null",
-         "\" Random desc, album, disc, track, title, artist, genre, year, path, duration \""},
-        {0, nullptr, "artist", 0, "null",
-         "\" artist desc, album, disc, track, title, genre, year, path, duration \""},
-        // 26 bytes, a space and "desc" are the 31 that a term may have; beyond, it is cut.
-        {0, nullptr, "abcdefghijklmnopqrstuvwxyz", 0, "null",
-         "\" abcdefghijklmnopqrstuvwxyz desc, album, disc, track, title, artist, genre, year, "
-         "path, duration \""},
-        {0, nullptr, "abcdefghijklmnopqrstuvwxyz1", 0, "null",
-         "\" abcdefghijklmnopqrstuvwxyz1 des, album, disc, track, title, artist, genre, year, "
-         "path, duration \""},
-        {0, nullptr, "abcdefghijklmnopqrstuvwxyz123456", 0, "null",
-         "\" abcdefghijklmnopqrstuvwxyz12345, album, disc, track, title, artist, genre, year, "
-         "path, duration \""},
-    };
-    for (const ListCase &each : cases) {
+    const auto expectOpen = [](const std::string &condition, const std::string &order,
+                               const std::function<int(ZANO_PLAYLIST_REC **)> &call) {
         List list;
-        EXPECT_EQ(outcome(ZANOMusicListAll(list.address(), each.category, each.keyword,
-                                           each.sortColumn, each.ascending, 100, 50)),
-                  "0 open(0, \"*\", " + each.condition + ", null, " + each.order +
-                      ", 100, 50, 0)\nclose\n");
+        EXPECT_EQ(outcome(call(list.address())),
+                  "0 open(0, \"*\", " + condition + ", null, " + order + ", 100, 50, 0)\nclose\n");
+    };
+    const std::string inRoot = "\"path like '/volume1/music/%' and ";
+    const struct {
+        int category;
+        const char *keyword;
+        std::string condition;
+    } conditions[] = {
+        {0, nullptr, "null"},
+        {1, "", "null"},
+        {0, "any", "null"},
+        {1, "Bob", inRoot + "title ilike '%Bob%'\""},
+        {2, "Bob", inRoot + "artist ilike '%Bob%'\""},
+        {3, "Bob", inRoot + "album ilike '%Bob%'\""},
+        {4, "Bob", inRoot + "genre ilike '%Bob%'\""},
+        {5, "it's",
+         inRoot + "(title ilike '%it''s%' or artist ilike '%it''s%' or album ilike '%it''s%' or "
+                  "genre ilike '%it''s%')\""},
+        {-1, "x", inRoot + " ilike '%x%'\""},
+        {6, "x", inRoot + " ilike '%x%'\""},
+        {1, "'\\%_", inRoot + "title ilike '%''\\\\%_%'\""},
+        {1, "\xFF@ZANO:NEVAR", inRoot + "title ilike '%\xFF@ZANO:NEVAR%'\""},
+    };
+    for (const auto &each : conditions) {
+        expectOpen(each.condition, kDefaultOrder, [&](ZANO_PLAYLIST_REC **list) {
+            const bool isFirst = each.category == 1;
+            return ZANOMusicListAll(list, each.category, each.keyword, isFirst ? "" : nullptr,
+                                    isFirst ? 7 : 1, 100, 50);
+        });
+    }
+    const std::string tail = ", album, disc, track, title, artist, genre, year, path, duration ";
+    const std::pair<std::string, std::string> orders[] = {
+        {"random", "RANDOM()"},
+        {"Random", " Random desc" + tail},
+        {"artist", " artist desc, album, disc, track, title, genre, year, path, duration "},
+        // 26 bytes, a space and "desc" are the 31 that a term may have; beyond, it is cut.
+        {"abcdefghijklmnopqrstuvwxyz", " abcdefghijklmnopqrstuvwxyz desc" + tail},
+        {"abcdefghijklmnopqrstuvwxyz1", " abcdefghijklmnopqrstuvwxyz1 des" + tail},
+        {"abcdefghijklmnopqrstuvwxyz123456", " abcdefghijklmnopqrstuvwxyz12345" + tail},
+    };
+    for (const auto &[column, order] : orders) {
+        expectOpen("null", '"' + order + '"', [&](ZANO_PLAYLIST_REC **list) {
+            return ZANOMusicListAll(list, 0, nullptr, column.c_str(), 0, 100, 50);
+        });
     }
 }
 

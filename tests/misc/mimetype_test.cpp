@@ -8,12 +8,11 @@
 
 #include <array>
 #include <cstdint>
-#include <filesystem>
-#include <fstream>
 #include <string>
 #include <vector>
 
 #include "support/failing_allocator.h"
+#include "support/files.h"
 #include "support/platform_stand_in.h"
 #include "system_paths_internal.h"
 
@@ -37,18 +36,10 @@ class Mimetype : public stand_in::Test {
     Mimetype() {
         // None, and above all not that of an empty file.
         failing_allocator::failOnSize(SIZE_MAX);
-        for (const fs::path path : {ZANO_PATH_MIME_MAPPING, ZANO_PATH_MIME_GENERATOR}) {
-            fs::create_directories(path.parent_path());
-            fs::remove_all(path);
-        }
     }
-    ~Mimetype() override {
-        fs::remove_all(ZANO_PATH_MIME_MAPPING);
-        fs::remove(ZANO_PATH_MIME_GENERATOR);
-    }
-    static void map(const std::string &text) { std::ofstream(ZANO_PATH_MIME_MAPPING) << text; }
+    static void map(const std::string &text) { files::write(ZANO_PATH_MIME_MAPPING, text); }
     static void generateWith(const std::string &script) {
-        std::ofstream(ZANO_PATH_MIME_GENERATOR) << "#!/bin/sh\n" << script;
+        files::write(ZANO_PATH_MIME_GENERATOR, "#!/bin/sh\n" + script);
         fs::permissions(ZANO_PATH_MIME_GENERATOR, fs::perms::owner_all);
     }
     /* The type, or the result of a failure. */
@@ -57,6 +48,9 @@ class Mimetype : public stand_in::Test {
         const int result = ZANOAudioGetMimetype(extension, out.data(), out.size());
         return result == 0 ? out.data() : std::to_string(result);
     }
+
+  private:
+    const files::Places places_{ZANO_PATH_MIME_MAPPING, ZANO_PATH_MIME_GENERATOR};
 };
 
 TEST_F(Mimetype, IsTheSecondQuotedTextBehindTheFirstPlaceOfTheExtension) {

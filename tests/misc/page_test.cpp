@@ -145,26 +145,15 @@ TEST(MediaId, IsMaskedByDigitsOfTheGenerator) {
 }
 
 TEST(MediaId, OfOtherTextsIsNone) {
-    const std::pair<const char *, int> cases[] = {
-        {nullptr, -1},
-        {"", -1},
-        {"12345", -1},
-        {"123456", -1},
-        {"12344321", -1},
-        {"abccba", 0xABCCBA},
-        {"abccba00", 0xABCCBA},
-        {"zzzzzz", -1},
-        {"000000zz", -1},
-        {"0000001ffffffff1ffffffff", -1},
-        {"0000000000000005000000005", -1},
-        {"000000000000005000000005", 5},
-        {"-00000-1-1", -1},
-        {"0x00x0", -1},
-        {"00000000/../../etc/passwd", -1},
-    };
-    for (const auto &[text, id] : cases) {
-        EXPECT_EQ(MediaIDDecryption(text), id) << (text != nullptr ? text : "null");
+    for (const char *none :
+         {"", "12345", "123456", "12344321", "zzzzzz", "000000zz", "0000001ffffffff1ffffffff",
+          "0000000000000005000000005", "-00000-1-1", "0x00x0", "00000000/../../etc/passwd"}) {
+        EXPECT_EQ(MediaIDDecryption(none), -1) << none;
     }
+    EXPECT_EQ(MediaIDDecryption(nullptr), -1);
+    EXPECT_EQ(MediaIDDecryption("abccba"), 0xABCCBA);
+    EXPECT_EQ(MediaIDDecryption("abccba00"), 0xABCCBA);
+    EXPECT_EQ(MediaIDDecryption("000000000000005000000005"), 5);
 }
 
 }  // namespace

@@ -12,6 +12,7 @@
 #include <string>
 #include <vector>
 
+#include "support/files.h"
 #include "system_paths_internal.h"
 
 namespace {
@@ -109,7 +110,7 @@ TEST(SqlEscape, TemplatesTakeTheirTextsInOrderAndAsTheyAre) {
 }
 
 TEST(Settings, LinesWithAndWithoutQuotes) {
-    std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
+    const files::Places places{ZANO_PATH_CONF};
     std::ofstream(ZANO_PATH_CONF)
         << "# a comment\n\n  runvorelix = \"yes\"  \r\nplain=text\n"
            "#off=\"x\"\nempty=\"\"\nhalf=\"\ntwice=1\ntwice=\"2=3\"\nnothing\n=x\n";
@@ -125,7 +126,6 @@ TEST(Settings, LinesWithAndWithoutQuotes) {
     EXPECT_EQ(ZanoConf().Info("plain", "fallback"), "fallback");
     std::filesystem::create_directory(ZANO_PATH_CONF);
     EXPECT_EQ(ZanoConf().Info("plain", "fallback"), "fallback") << "of a folder";
-    std::filesystem::remove(ZANO_PATH_CONF);
 }
 
 }  // namespace

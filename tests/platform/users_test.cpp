@@ -10,6 +10,7 @@
 #include <fstream>
 #include <string>
 
+#include "support/files.h"
 #include "system_paths_internal.h"
 
 namespace {
@@ -27,16 +28,7 @@ std::string load(const Wanted &wanted) {
 }
 
 class Users : public testing::Test {
-  protected:
-    Users() {
-        fs::create_directories(fs::path(ZANO_PATH_PASSWD).parent_path());
-        removeFiles();
-    }
-    ~Users() override { removeFiles(); }
-    static void removeFiles() {
-        fs::remove(ZANO_PATH_PASSWD);
-        fs::remove(ZANO_PATH_GROUP);
-    }
+    const files::Places places_{ZANO_PATH_PASSWD, ZANO_PATH_GROUP};
 };
 
 TEST_F(Users, AreThoseOfTheDevicesFile) {

@@ -3,9 +3,9 @@
 #include <vorelix/vorelix.h>
 #include <zanoplatform/media_database.h>
 
-#include <array>
 #include <string>
 
+#include "families.h"
 #include "platform/mediadb/cluster.h"
 #include "support/files.h"
 #include "system_paths_internal.h"
@@ -15,11 +15,12 @@ namespace {
 class EditFiles : public testing::Test, protected files::Folder {
   protected:
     EditFiles() {
-        std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
         files::write(ZANO_PATH_CONF,
                      "mediadb=\"" + zano::mediadb::locationForTest(path("media.db")) + "\"\n");
     }
-    ~EditFiles() override { std::filesystem::remove(ZANO_PATH_CONF); }
+
+  private:
+    const files::Places places_{ZANO_PATH_CONF};
 };
 
 ZANO_PLAYLIST_REC record(const std::string &path, const char *title) {
@@ -33,36 +34,29 @@ ZANO_PLAYLIST_REC record(const std::string &path, const char *title) {
 
 /* By id first: the row makes the media database, without which no playlist can be read. */
 TEST_F(EditFiles, AppendedInsertedRemovedAndPruned) {
-    for (const bool byId : {true, false}) {
-        const std::string file = path(byId ? "id.m3u" : "path.m3u");
+    for (const playlists::Family &family : playlists::kFamilies) {
+        const std::string file = path(family.isShared ? "id.m3u" : "path.m3u");
+        std::string list = file;
         ASSERT_EQ(ZANOWriteMusicPlaylist(nullptr, file.c_str()), 0);
-        std::array<char, 16> id{};
-        if (byId) {
+        if (family.isShared) {
             ZANO_MEDIA_INFO row{};
             file.copy(row.path, sizeof row.path - 1);
             ASSERT_EQ(ZANOPlaylistDBSave(&row), 0);
-            ASSERT_EQ(ZANOPlaylistIDGet(file.c_str(), id.data(), id.size()), 0);
+            ASSERT_EQ(ZANOPlaylistIDGet(file.c_str(), list.data(), static_cast<int>(list.size())),
+                      0);
         }
         ZANO_PLAYLIST_REC song = record(path("a.mp3"), "A");
         ZANO_PLAYLIST_REC address = record("http://w", "W");
-        EXPECT_EQ(byId ? ZANOPlaylistAppendSongs(id.data(), &song, 1)
-                       : ZANOPersonalPlaylistAppendSongs(file.c_str(), &song, 1),
-                  0);
-        EXPECT_EQ(byId ? ZANOPlaylistUpdateSongs(id.data(), &address, 0, 0)
-                       : ZANOPersonalPlaylistUpdateSongs(file.c_str(), &address, 0, 0),
-                  0);
+        EXPECT_EQ(family.appendSongs(list.c_str(), &song, 1), 0);
+        EXPECT_EQ(family.updateSongs(list.c_str(), &address, 0, 0), 0);
         EXPECT_EQ(files::read(file),
                   "#EXTM3U\r\n#EXTINF:61,W\r\n#EXTINFYEAR:1999\r\nhttp://w\r\n"
                   "#EXTINF:61,A\r\n#EXTINFYEAR:1999\r\na.mp3\r\n");
-        EXPECT_EQ(byId ? ZANOPlaylistRemoveSongs(id.data(), "2")
-                       : ZANOPersonalPlaylistRemoveSongs(file.c_str(), "2"),
-                  0);
+        EXPECT_EQ(family.removeSongs(list.c_str(), "2"), 0);
         // The removal does not read year and duration.
         EXPECT_EQ(files::read(file),
                   "#EXTM3U\r\n#EXTINF:0,W\r\nhttp://w\r\n#EXTINF:0,A\r\na.mp3\r\n");
-        EXPECT_EQ(byId ? ZANOPlaylistRemoveMissing(id.data())
-                       : ZANOPersonalPlaylistRemoveMissing(file.c_str()),
-                  0);
+        EXPECT_EQ(family.removeMissing(list.c_str()), 0);
         EXPECT_EQ(files::read(file), "#EXTM3U\r\n#EXTINF:0,W\r\nhttp://w\r\n");
     }
 }

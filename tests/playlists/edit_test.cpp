@@ -6,30 +6,18 @@
 #include <string>
 #include <vector>
 
+#include "families.h"
 #include "support/failing_allocator.h"
 #include "support/files.h"
 #include "support/platform_stand_in.h"
 
 namespace {
 
+using playlists::Family;
+using playlists::kFamilies;
 using stand_in::outcome;
 using stand_in::script;
 using stand_in::takeTrace;
-
-/* The edits of shared playlists by id, and of personal ones by path. */
-struct Family {
-    bool isShared;
-    int (*removeSongs)(const char *playlist, const char *selection);
-    int (*updateSongs)(const char *playlist, ZANO_PLAYLIST_REC *records, int start, int count);
-    int (*appendSongs)(const char *playlist, ZANO_PLAYLIST_REC *records, int recordCount);
-    int (*removeMissing)(const char *playlist);
-};
-constexpr Family kFamilies[] = {
-    {true, ZANOPlaylistRemoveSongs, ZANOPlaylistUpdateSongs, ZANOPlaylistAppendSongs,
-     ZANOPlaylistRemoveMissing},
-    {false, ZANOPersonalPlaylistRemoveSongs, ZANOPersonalPlaylistUpdateSongs,
-     ZANOPersonalPlaylistAppendSongs, ZANOPersonalPlaylistRemoveMissing},
-};
 
 /* Each name is a song beside the playlist; names are parted by blanks. */
 class Edit : public stand_in::Test,

@@ -9,8 +9,10 @@
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <initializer_list>
 #include <iterator>
 #include <string>
+#include <vector>
 
 namespace files {
 
@@ -43,6 +45,27 @@ class Folder {
 
   private:
     std::string path_ = testing::TempDir() + "vorelix_XXXXXX";
+};
+
+/* Fixed paths at which nothing stands at first, but whose folders are there, nor at the end. */
+class Places {
+  public:
+    Places(std::initializer_list<const char *> paths) : paths_(paths.begin(), paths.end()) {
+        for (const std::filesystem::path &path : paths_) {
+            std::filesystem::create_directories(path.parent_path());
+            std::filesystem::remove_all(path);
+        }
+    }
+    ~Places() {
+        for (const std::filesystem::path &path : paths_) {
+            std::filesystem::remove_all(path);
+        }
+    }
+    Places(const Places &) = delete;
+    Places &operator=(const Places &) = delete;
+
+  private:
+    std::vector<std::filesystem::path> paths_;
 };
 
 /* While it is there, no file grows beyond so many bytes, as on a disk that is full. */

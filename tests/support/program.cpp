@@ -1,11 +1,13 @@
 #include "support/program.h"
 
+#include <arpa/inet.h>
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
 #include <pty.h>
 #include <sys/prctl.h>
 #include <sys/resource.h>
+#include <sys/socket.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -97,6 +99,7 @@ int inputOf(const std::string &text) {
     for (const int signal : {SIGINT, SIGTERM, SIGHUP}) {
         std::signal(signal, SIG_DFL);
     }
+    prctl(PR_SET_PDEATHSIG, SIGKILL);
     std::signal(SIGPIPE, SIG_IGN);  // as some callers leave it
     if (!start.mayReadEverything && geteuid() == 0 &&
         (prctl(PR_CAPBSET_DROP, CAP_DAC_OVERRIDE) != 0 ||
@@ -124,6 +127,18 @@ int inputOf(const std::string &text) {
 }
 
 }  // namespace
+
+int freePort() {
+    const int file = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    sockaddr_in address{};
+    address.sin_family = AF_INET;
+    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    socklen_t size = sizeof address;
+    auto *const general = reinterpret_cast<sockaddr *>(&address);
+    EXPECT_EQ(bind(file, general, size) | getsockname(file, general, &size), 0);
+    close(file);
+    return ntohs(address.sin_port);
+}
 
 Process::Process(const Start &start) : haveErrorsAnEnd_(start.errors != Stream::Kept) {
     const Ends output = openStream(start.output, start.columns);
@@ -191,6 +206,17 @@ Ended Process::wait() {
     getrusage(RUSAGE_CHILDREN, &usage);
     ended.peakKilobytes = usage.ru_maxrss;
     return ended;
+}
+
+Ended Process::stop(int signal) {
+    kill(pid_, signal);
+    return wait();
+}
+
+bool Process::isRunning() const {
+    siginfo_t ended{};
+    return waitid(P_PID, static_cast<id_t>(pid_), &ended, WEXITED | WNOHANG | WNOWAIT) == 0 &&
+           ended.si_pid == 0;
 }
 
 pid_t Process::release() {

@@ -14,6 +14,9 @@ namespace program {
 
 using process::statusOf;
 
+/* A port of the loopback interface on which nobody listens. */
+int freePort();
+
 struct Ended {
     int status;  // exit code, or 128 and the number of the signal
     std::string out;
@@ -36,7 +39,7 @@ struct Start {
     bool mayReadEverything = true;    // as root may
 };
 
-/* A process; killed if it is still there at the end. */
+/* A process; killed if it is still there at the end, or when its test has died. */
 class Process {
   public:
     explicit Process(const Start &start);
@@ -50,6 +53,9 @@ class Process {
     /* The next line of standard output; fails the test when none comes within a minute. */
     std::string readLine();
     Ended wait();
+    /* Sends a signal and waits. */
+    Ended stop(int signal);
+    bool isRunning() const;
     /* Leaves the process to the caller. */
     pid_t release();
 

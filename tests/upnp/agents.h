@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 #include <poll.h>
 #include <sys/syscall.h>
-#include <sys/wait.h>
 #include <unistd.h>
 #include <vorelix/upnp/dmagent.h>
 
@@ -13,6 +12,8 @@
 #include <functional>
 #include <memory>
 #include <string>
+
+#include "support/process.h"
 
 namespace upnp_test {
 
@@ -26,11 +27,10 @@ inline std::string takeResponse(DMAgent &agent) {
 /* True when work in a child is still under way a while after isDue() has come true. */
 inline bool isUnderWay(
     const std::function<void()> &work, const std::function<bool()> &isDue = [] { return true; }) {
-    const pid_t child = fork();
-    if (child == 0) {
+    const pid_t child = process::start([&] {
         work();
-        _exit(0);
-    }
+        return 0;
+    });
     const auto handle = static_cast<int>(syscall(SYS_pidfd_open, child, 0));
     pollfd end{handle, POLLIN, 0};
     constexpr int kPatience = 3000;  // tens of milliseconds
@@ -39,10 +39,8 @@ inline bool isUnderWay(
     EXPECT_TRUE(isDue());
     poll(&end, 1, 50);
     kill(child, SIGKILL);
-    int status = 0;
-    waitpid(child, &status, 0);
     close(handle);
-    return WIFSIGNALED(status) && WTERMSIG(status) == SIGKILL;
+    return process::statusOf(child) == 128 + SIGKILL;
 }
 
 }  // namespace upnp_test

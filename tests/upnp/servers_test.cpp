@@ -14,8 +14,6 @@ using upnp_test::isUnderWay;
 using upnp_test::takeResponse;
 
 TEST(Servers, GiveWhateverTheyGive) {
-    const std::string gzip("\x1F\x8B\x08\0 &packed", 12);
-    const Server elsewhere(reply("elsewhere"));
     struct {
         const char *name;
         Reply reply;
@@ -23,9 +21,6 @@ TEST(Servers, GiveWhateverTheyGive) {
         unsigned size;
         const char *response;
     } cases[] = {
-        {"empty body", reply(""), 0, 0, "(null)"},
-        {"no word", {""}, 52, 0, "(null)"},
-        {"no HTTP", {"hello\r\n\r\n"}, 1, 0, "(null)"},
         {"closed in mid-body", {"HTTP/1.1 200 OK\r\nContent-Length: 90\r\n\r\n&lt;a"}, 18, 5, "<a"},
         {"longer than it says",
          {"HTTP/1.1 200 OK\r\nContent-Length: 3\r\n\r\nabcdef"},
@@ -38,13 +33,7 @@ TEST(Servers, GiveWhateverTheyGive) {
          56,
          3,
          "abc"},
-        {"error status", reply("<a>&lt;fault&gt;</a>", "500 Internal Server Error"), 0, 20,
-         "<a><fault></a>"},
         {"not found", reply("gone", "404 Not Found"), 0, 4, "gone"},
-        {"redirect", reply("moved", "302 Found", "Location: " + elsewhere.url() + "\r\n"), 0, 5,
-         "moved"},
-        {"gzip unasked", reply(gzip, "200 OK", "Content-Encoding: gzip\r\n"), 0, 12,
-         "\x1F\x8B\x08"},
     };
     for (const auto &row : cases) {
         SCOPED_TRACE(row.name);
@@ -54,7 +43,6 @@ TEST(Servers, GiveWhateverTheyGive) {
         EXPECT_EQ(browse.responseSize, row.size);
         EXPECT_EQ(takeResponse(browse), row.response);
     }
-    EXPECT_TRUE(elsewhere.requests().empty());
 }
 
 TEST(Servers, MayNotBeThere) {

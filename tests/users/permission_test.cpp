@@ -26,17 +26,7 @@ struct Store : AudioUsers {
 };
 
 class Permissions : public stand_in::Test {
-  protected:
-    Permissions() {
-        fs::create_directories(fs::path(ZANO_PATH_AUDIO_USERS).parent_path());
-        removeFiles();
-    }
-    ~Permissions() override { removeFiles(); }
-    static void removeFiles() {
-        for (const char *path : {ZANO_PATH_AUDIO_USERS, ZANO_PATH_PASSWD, ZANO_PATH_GROUP}) {
-            fs::remove_all(path);
-        }
-    }
+    const files::Places places_{ZANO_PATH_AUDIO_USERS, ZANO_PATH_PASSWD, ZANO_PATH_GROUP};
 };
 
 TEST_F(Permissions, OfAnEntryAreItsTrueFlags) {

@@ -1,9 +1,8 @@
 #include <gtest/gtest.h>
 
-#include <filesystem>
-#include <fstream>
 #include <string>
 
+#include "support/files.h"
 #include "support/process.h"
 #include "system_paths_internal.h"
 
@@ -23,12 +22,11 @@ std::string answerOf(const std::string &action) {
 
 class Answers : public testing::Test {
   protected:
-    Answers() {
-        std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
-        setUp("runvorelix=\"yes\"\n");
-    }
-    ~Answers() override { std::filesystem::remove(ZANO_PATH_CONF); }
-    static void setUp(const char *settings) { std::ofstream(ZANO_PATH_CONF) << settings; }
+    Answers() { setUp("runvorelix=\"yes\"\n"); }
+    static void setUp(const char *settings) { files::write(ZANO_PATH_CONF, settings); }
+
+  private:
+    const files::Places places_{ZANO_PATH_CONF};
 };
 
 TEST_F(Answers, OfAServiceThatIsOffAreOneRefusal) {

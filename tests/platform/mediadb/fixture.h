@@ -16,6 +16,7 @@
 
 #include "mediadb/catalogue.h"
 #include "mediadb/clock_tick.h"
+#include "support/files.h"
 #include "system_paths_internal.h"
 
 namespace zano::mediadb {
@@ -24,23 +25,16 @@ class MediaDatabaseTest : public testing::Test {
   protected:
     /* `location`: "" for a file of SQLite in a folder of its own. */
     explicit MediaDatabaseTest(std::string location = "") : location_(std::move(location)) {
-        std::string pattern = (std::filesystem::temp_directory_path() / "mediadb-XXXXXX").string();
-        folder_ = mkdtemp(pattern.data());
-        std::filesystem::create_directories(std::filesystem::path(ZANO_PATH_CONF).parent_path());
         if (location_.empty()) {
             location_ = "sqlite:" + databasePath();
         }
         setSetting(location_);
     }
-    ~MediaDatabaseTest() override {
-        std::filesystem::remove(ZANO_PATH_CONF);
-        std::filesystem::remove_all(folder_);
-    }
 
-    std::string databasePath() const { return folder_ + "/media.db"; }
+    std::string databasePath() const { return folder_.path("media.db"); }
     const std::string &location() const { return location_; }
     static void setSetting(const std::string &value) {
-        std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << value << "\"\n";
+        files::write(ZANO_PATH_CONF, "mediadb=\"" + value + "\"\n");
         awaitTick();
     }
     /* The settings and the database file are looked at once in a tick of the clock. */
@@ -108,7 +102,8 @@ class MediaDatabaseTest : public testing::Test {
     }
 
   private:
-    std::string folder_;
+    const files::Places places_{ZANO_PATH_CONF};
+    const files::Folder folder_;
     std::string location_;
 };
 

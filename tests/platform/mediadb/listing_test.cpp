@@ -12,33 +12,28 @@
 namespace zano::mediadb {
 namespace {
 
-using Less = std::function<bool(const Song &, const Song &)>;
-
 auto tailOf(const Song &song) {
     return std::tuple(foldedKey(song.album), song.disc, song.track, foldedKey(song.title),
                       foldedKey(song.artist), foldedKey(song.genre), song.year, song.path,
                       song.duration);
 }
 
+/* A column that leads an order, and by what it sorts. */
 struct Leading {
     std::string name;
-    Less less;
+    std::function<std::pair<std::string, double>(const Song &)> keyOf;
 };
 
 const std::vector<Leading> &leadingColumns() {
     static const std::vector<Leading> columns = {
-        {"lower(title)",
-         [](const Song &a, const Song &b) { return foldedKey(a.title) < foldedKey(b.title); }},
-        {"artist",
-         [](const Song &a, const Song &b) { return foldedKey(a.artist) < foldedKey(b.artist); }},
-        {"lower(album)",
-         [](const Song &a, const Song &b) { return foldedKey(a.album) < foldedKey(b.album); }},
-        {"genre",
-         [](const Song &a, const Song &b) { return foldedKey(a.genre) < foldedKey(b.genre); }},
-        {"year", [](const Song &a, const Song &b) { return a.year < b.year; }},
-        {"duration", [](const Song &a, const Song &b) { return a.duration < b.duration; }},
-        {"path", [](const Song &a, const Song &b) { return a.path < b.path; }},
-        {"track", [](const Song &a, const Song &b) { return a.track < b.track; }},
+        {"lower(title)", [](const Song &song) { return std::pair(foldedKey(song.title), 0.0); }},
+        {"artist", [](const Song &song) { return std::pair(foldedKey(song.artist), 0.0); }},
+        {"lower(album)", [](const Song &song) { return std::pair(foldedKey(song.album), 0.0); }},
+        {"genre", [](const Song &song) { return std::pair(foldedKey(song.genre), 0.0); }},
+        {"year", [](const Song &song) { return std::pair("", song.year); }},
+        {"duration", [](const Song &song) { return std::pair("", song.duration); }},
+        {"path", [](const Song &song) { return std::pair(song.path, 0.0); }},
+        {"track", [](const Song &song) { return std::pair("", song.track); }},
     };
     return columns;
 }
@@ -91,10 +86,9 @@ class ListingTest : public EngineTest {
             }
         }
         std::sort(songs.begin(), songs.end(), [&](const Song &a, const Song &b) {
-            if (leading.less(a, b) || leading.less(b, a)) {
-                return descending ? leading.less(b, a) : leading.less(a, b);
-            }
-            return tailOf(a) < tailOf(b);
+            const auto first = leading.keyOf(a);
+            const auto second = leading.keyOf(b);
+            return first == second ? tailOf(a) < tailOf(b) : descending != (first < second);
         });
         std::vector<std::string> paths;
         for (const Song &song : songs) {

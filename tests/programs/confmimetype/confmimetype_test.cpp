@@ -1,15 +1,14 @@
 #include <gtest/gtest.h>
-#include <unistd.h>
 #include <vorelix/misc/misc.h>
 
 #include <array>
-#include <filesystem>
 #include <fstream>
 #include <map>
 #include <set>
 #include <sstream>
 #include <string>
 
+#include "support/files.h"
 #include "support/process.h"
 #include "system_paths_internal.h"
 
@@ -32,24 +31,14 @@ std::string typeOf(const std::string &extension) {
 /* The program stands where the library looks for it, and the mapping is not made yet. */
 class Confmimetype : public testing::Test {
   protected:
-    Confmimetype() {
-        for (const fs::path path : {ZANO_PATH_MIME_MAPPING, ZANO_PATH_MIME_GENERATOR}) {
-            fs::create_directories(path.parent_path());
-            fs::remove_all(path);
-        }
-    }
-    ~Confmimetype() override {
-        fs::remove(ZANO_PATH_MIME_MAPPING);
-        fs::remove(ZANO_PATH_MIME_GENERATOR);
-        fs::remove(dataFile_);
-    }
     std::string dataFile(const std::string &text) const {
-        std::ofstream(dataFile_) << text;
-        return "'" + dataFile_ + "'";
+        files::write(folder_.path("data"), text);
+        return "'" + folder_.path("data") + "'";
     }
 
   private:
-    const std::string dataFile_ = testing::TempDir() + "mime_data_" + std::to_string(getpid());
+    const files::Places places_{ZANO_PATH_MIME_MAPPING, ZANO_PATH_MIME_GENERATOR};
+    const files::Folder folder_;
 };
 
 /* What the system's two files have for each extension. */

@@ -1,13 +1,10 @@
 #include "command_line.h"
 
 #include "support/json.h"
-#include "system_paths_internal.h"
 
 namespace command_line {
 
 namespace {
-
-namespace fs = std::filesystem;
 
 program::Start startOf(const Invocation &invocation) {
     std::vector<std::string> words = {"vorelix"};
@@ -34,12 +31,7 @@ pid_t start(const Invocation &invocation) {
 }
 
 CommandLine::CommandLine() {
-    fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
     files::write(ZANO_PATH_CONF, "mediadb=\"" + location_ + "\"\n");
-}
-
-CommandLine::~CommandLine() {
-    fs::remove(ZANO_PATH_CONF);
 }
 
 void CommandLine::fill(const std::vector<zano::mediadb::Song> &songs) const {

@@ -16,6 +16,7 @@
 #include "platform/mediadb/cluster.h"
 #include "support/files.h"
 #include "support/program.h"
+#include "system_paths_internal.h"
 
 namespace command_line {
 
@@ -41,7 +42,6 @@ pid_t start(const Invocation &invocation);
 class CommandLine : public testing::Test {
   protected:
     CommandLine();
-    ~CommandLine() override;
 
     /* Makes the database with these songs; their ids count from 1. */
     void fill(const std::vector<zano::mediadb::Song> &songs) const;
@@ -50,6 +50,7 @@ class CommandLine : public testing::Test {
     static Json::Value answerOf(std::vector<std::string> arguments);
 
   private:
+    const files::Places places_{ZANO_PATH_CONF};
     files::Folder temporary_;
 
   protected:

@@ -18,15 +18,14 @@ namespace fs = std::filesystem;
 class Drafts : public testing::Test, protected files::Folder {
   protected:
     Drafts() {
-        fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
         files::write(ZANO_PATH_CONF, "mediadb=\"sqlite:" + path("media.db") + "\"\n");
         EXPECT_EQ(MediaInfoDBSave(MEDIA_TABLE_PLAYLISTS, std::make_unique<ZANO_MEDIA_INFO>().get()),
                   0);
         fs::create_directory(folder_);
         files::write(file_, kOld);
     }
-    ~Drafts() override { fs::remove(ZANO_PATH_CONF); }
 
+    const files::Places places_{ZANO_PATH_CONF};
     static Entries reversed(const Entries &entries) { return {entries.rbegin(), entries.rend()}; }
 
     static constexpr const char *kOld = "#EXTM3U\r\na.mp3\r\nb.mp3\r\n";

@@ -11,15 +11,8 @@ using Words = std::vector<std::string>;
 class Users : public CommandLine {
   protected:
     Users() {
-        removeFiles();
         files::write(ZANO_PATH_PASSWD, "admin:x:1024:1:::\nann:x:1026:1:::\nbob:x:1027:1:::\n");
         files::write(ZANO_PATH_GROUP, "ZANO.VXT.Vorelix.Application:x:2:ann\n");
-    }
-    ~Users() override { removeFiles(); }
-    static void removeFiles() {
-        for (const char *path : {ZANO_PATH_AUDIO_USERS, ZANO_PATH_PASSWD, ZANO_PATH_GROUP}) {
-            fs::remove_all(path);
-        }
     }
     /* What the command prints, its error where it fails. */
     static std::string says(Words words) {
@@ -28,6 +21,9 @@ class Users : public CommandLine {
         EXPECT_EQ(ended.status == 0, ended.err.empty()) << ended.err;
         return ended.out + ended.err;
     }
+
+  private:
+    const files::Places places_{ZANO_PATH_AUDIO_USERS, ZANO_PATH_PASSWD, ZANO_PATH_GROUP};
 };
 
 TEST_F(Users, AreSetShownAndRemoved) {

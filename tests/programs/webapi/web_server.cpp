@@ -2,9 +2,7 @@
 
 #include <arpa/inet.h>
 #include <netinet/in.h>
-#include <sys/prctl.h>
 #include <sys/socket.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -24,27 +22,12 @@ namespace fs = std::filesystem;
 
 constexpr const char *kPasswordHash = "{SHA}EfatjsUqKYSrqv18O1FlA3hcIHI=";
 
-void writeBelowRoot(const std::string &path, const std::string &text) {
-    fs::create_directories(fs::path(path).parent_path());
-    files::write(path, text);
-}
-
 sockaddr_in loopback(int port) {
     sockaddr_in address{};
     address.sin_family = AF_INET;
     address.sin_port = htons(static_cast<uint16_t>(port));
     address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
     return address;
-}
-
-int freePort() {
-    const int socket = ::socket(AF_INET, SOCK_STREAM, 0);
-    sockaddr_in address = loopback(0);
-    socklen_t size = sizeof address;
-    EXPECT_EQ(bind(socket, reinterpret_cast<sockaddr *>(&address), size), 0);
-    EXPECT_EQ(getsockname(socket, reinterpret_cast<sockaddr *>(&address), &size), 0);
-    close(socket);
-    return ntohs(address.sin_port);
 }
 
 std::string decodedChunks(const std::string &body) {
@@ -107,19 +90,17 @@ std::string Answer::outcome() const {
 }
 
 Front::Front() : music_(files_.path("music")) {
-    writeBelowRoot(ZANO_PATH_CONF,
-                   "mediadb=\"sqlite:" + path("media.db") + "\"\nrunvorelix=\"yes\"\n");
-    writeBelowRoot(ZANO_PATH_PASSWD,
-                   "sam:x:1026:100::/:/bin/false\npat:x:1027:100::/:/bin/false\n"
-                   "none:x:1028:100::/:/bin/false\n");
-    writeBelowRoot(ZANO_PATH_GROUP, "ZANO.VXT.Vorelix.Application:x:300:sam,pat\n");
-    writeBelowRoot(
+    files::write(ZANO_PATH_CONF,
+                 "mediadb=\"sqlite:" + path("media.db") + "\"\nrunvorelix=\"yes\"\n");
+    files::write(ZANO_PATH_PASSWD,
+                 "sam:x:1026:100::/:/bin/false\npat:x:1027:100::/:/bin/false\n"
+                 "none:x:1028:100::/:/bin/false\n");
+    files::write(ZANO_PATH_GROUP, "ZANO.VXT.Vorelix.Application:x:300:sam,pat\n");
+    files::write(
         ZANO_PATH_AUDIO_USERS,
         R"({"1026": {"streaming": true}, "1027": {"playlist": true}, "1028": {"usb": true}})");
-    writeBelowRoot(ZANO_PATH_MIME_MAPPING, "\"mp3\" \"audio/mpeg\"\n");
+    files::write(ZANO_PATH_MIME_MAPPING, "\"mp3\" \"audio/mpeg\"\n");
     fs::create_directories(music_);
-    fs::create_directories(fs::path(ZANO_PATH_MUSIC_LINK).parent_path());
-    fs::remove(ZANO_PATH_MUSIC_LINK);
     fs::create_directory_symlink(music_, ZANO_PATH_MUSIC_LINK);
     for (const char *title : {"a", "b", "c"}) {
         const fs::path song = music_ / (std::string(title) + ".mp3");
@@ -129,13 +110,8 @@ Front::Front() : music_(files_.path("music")) {
 }
 
 Front::~Front() {
-    if (server_ != -1) {
-        kill(server_, SIGTERM);
-        waitpid(server_, nullptr, 0);
-    }
-    for (const char *path : {ZANO_PATH_CONF, ZANO_PATH_PASSWD, ZANO_PATH_GROUP,
-                             ZANO_PATH_AUDIO_USERS, ZANO_PATH_MIME_MAPPING, ZANO_PATH_MUSIC_LINK}) {
-        fs::remove(path);
+    if (server_) {
+        server_->stop(SIGTERM);
     }
 }
 
@@ -177,38 +153,31 @@ void Front::serveDevice() {
 }
 
 void Front::serveLocal() {
-    serve(LIGHTTPD "/local.conf", {"VORELIX_USER=sam", "VORELIX_WEBAPI=" WEBAPI,
-                                   "VORELIX_PAGE=" PAGE, "VORELIX_ERRORS=" ERRORS});
+    serve(LIGHTTPD "/local.conf", {{"VORELIX_USER", "sam"},
+                                   {"VORELIX_WEBAPI", WEBAPI},
+                                   {"VORELIX_PAGE", PAGE},
+                                   {"VORELIX_ERRORS", ERRORS}});
 }
 
 /* Another program may take the port before the server does. */
-void Front::serve(const std::string &configuration, std::vector<std::string> environment) {
+void Front::serve(const std::string &configuration,
+                  std::map<std::string, std::string> environment) {
     constexpr int kTries = 10;
     for (int tries = 0; tries < kTries; ++tries) {
-        port_ = freePort();
-        environment.push_back("VORELIX_PORT=" + std::to_string(port_));
-        std::vector<char *> variables;
-        for (std::string &variable : environment) {
-            variables.push_back(variable.data());
-        }
-        variables.push_back(nullptr);
-        server_ = fork();
-        if (server_ == 0) {
-            prctl(PR_SET_PDEATHSIG, SIGTERM);
-            execle(LIGHTTPD_PROGRAM, "lighttpd", "-D", "-f", configuration.c_str(), nullptr,
-                   variables.data());
-            _exit(127);
-        }
-        environment.pop_back();
-        while (waitpid(server_, nullptr, WNOHANG) == 0) {
+        port_ = program::freePort();
+        environment["VORELIX_PORT"] = std::to_string(port_);
+        server_ = std::make_unique<program::Process>(
+            program::Start{.path = LIGHTTPD_PROGRAM,
+                           .argv = {"lighttpd", "-D", "-f", configuration},
+                           .environment = environment});
+        while (server_->isRunning()) {
             if (const int socket = connectToServer(); socket != -1) {
                 close(socket);
                 return;
             }
         }
     }
-    server_ = -1;
-    FAIL() << "the web server does not start";
+    FAIL() << "the web server does not start: " << server_->wait().err;
 }
 
 int Front::connectToServer() const {

@@ -3,14 +3,15 @@
 
 #include <gtest/gtest.h>
 #include <json/value.h>
-#include <sys/types.h>
 
 #include <filesystem>
 #include <map>
+#include <memory>
 #include <string>
-#include <vector>
 
 #include "support/files.h"
+#include "support/program.h"
+#include "system_paths_internal.h"
 
 namespace web_test {
 
@@ -70,13 +71,16 @@ class Front : public testing::Test {
     std::string path(const std::string &name) const { return files_.path(name); }
 
   private:
-    void serve(const std::string &configuration, std::vector<std::string> environment);
+    void serve(const std::string &configuration, std::map<std::string, std::string> environment);
     int connectToServer() const;
 
+    const files::Places places_{ZANO_PATH_CONF,         ZANO_PATH_PASSWD,
+                                ZANO_PATH_GROUP,        ZANO_PATH_AUDIO_USERS,
+                                ZANO_PATH_MIME_MAPPING, ZANO_PATH_MUSIC_LINK};
     files::Folder files_;
     std::filesystem::path music_;
     int port_ = 0;
-    pid_t server_ = -1;
+    std::unique_ptr<program::Process> server_;
 };
 
 }  // namespace web_test

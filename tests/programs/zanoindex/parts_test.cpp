@@ -7,7 +7,6 @@
 #include "descriptor.h"
 #include "folder_watch.h"
 #include "formats.h"
-#include "path_list.h"
 #include "progress.h"
 #include "support/files.h"
 #include "text.h"
@@ -75,25 +74,6 @@ TEST(IndexFormats, Suffixes) {
     for (const auto &[name, format] : cases) {
         EXPECT_EQ(formatOfName(name), format) << name;
     }
-}
-
-TEST(IndexPathList, GivesBackWhatWasAdded) {
-    std::vector<std::string> paths = {"/a/b", "/a/b/c", "/a/b",
-                                      "",     "/x",     std::string("/\xFF\n", 3)};
-    paths.push_back(std::string(4095, 'p'));
-    PathList list;
-    for (std::size_t i = 0; i < paths.size(); ++i) {
-        list.add(paths[i], {static_cast<std::int64_t>(i), -1, 2}, i % 2 == 0);
-    }
-    PathList::Reader reader(list);
-    for (std::size_t i = 0; i < paths.size(); ++i) {
-        const auto file = reader.next();
-        ASSERT_TRUE(file);
-        EXPECT_EQ(file->path, paths[i]);
-        EXPECT_EQ(file->stamp, (mediadb::FileStamp{static_cast<std::int64_t>(i), -1, 2}));
-        EXPECT_EQ(file->isKnown, i % 2 == 0);
-    }
-    EXPECT_FALSE(reader.next());
 }
 
 ReadAnswer fullAnswer() {

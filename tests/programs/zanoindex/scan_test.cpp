@@ -63,19 +63,20 @@ TEST_F(ScanTest, ChangedFilesAreReadAgain) {
 }
 
 TEST_F(ScanTest, RowsOfVanishedFilesGo) {
-    addMany("a", 6);
+    addMany("a", 3);
     add("b/x.mp3");
     run({music()});
     fs::remove(music() + "/a/0.ogg");
     fs::rename(music() + "/b", music() + "/c");
+    // half of them is not more than half
     EXPECT_EQ(counts(summaryOf({music()})),
-              "added 1, updated 0, unchanged 5, removed 2, kept 0, failed 0");
+              "added 1, updated 0, unchanged 2, removed 2, kept 0, failed 0");
     EXPECT_EQ(paths().back(), "c/x.mp3");
     // other folders than the scanned one are left alone
     fs::remove(music() + "/c/x.mp3");
     EXPECT_EQ(counts(summaryOf({music() + "/a"})),
-              "added 0, updated 0, unchanged 5, removed 0, kept 0, failed 0");
-    EXPECT_EQ(paths().size(), 6U);
+              "added 0, updated 0, unchanged 2, removed 0, kept 0, failed 0");
+    EXPECT_EQ(paths().size(), 3U);
 }
 
 TEST_F(ScanTest, FolderThatLostItsSongsKeepsItsRows) {
@@ -150,14 +151,6 @@ TEST_F(ScanTest, PlaylistsAreListedWhileTheirFilesAreThere) {
     EXPECT_EQ(playlists().size(), 2U);
 }
 
-TEST_F(ScanTest, HalfIsNotMoreThanHalf) {
-    addMany("a", 4);
-    run({music()});
-    fs::remove(music() + "/a/0.ogg");
-    fs::remove(music() + "/a/1.ogg");
-    EXPECT_EQ(summaryOf({music()})["removed"], 2);
-}
-
 TEST_F(ScanTest, FolderThatWasNeverThere) {
     const auto ended = run({music() + "/nowhere"});
     EXPECT_EQ(ended.status, 1);
@@ -187,11 +180,18 @@ TEST_F(ScanTest, SongsBelowUnreadableFoldersAreKept) {
 }
 
 TEST_F(ScanTest, AnyNameIsIndexedAndOpensAgain) {
-    const Lines names = {
+    // of the longest step and path, too
+    const std::string step = std::string(250, 'p') + "/";
+    std::string longest = step;
+    while (longest.size() + music().size() + step.size() + 8 < 4096) {
+        longest += step;
+    }
+    Lines names = {
         "!before/x.mp3", "a b/x.mp3",      "a/x.mp3",      "a-b.mp3",       "Bj\xF6rk.mp3",
         "\xFF\xFE.mp3",  "two\nlines.mp3", "'quote\".mp3", "per%cent_.mp3", "back\\slash.mp3",
         "-d.mp3",        "trailing .mp3",  "UPPER.MP3",
     };
+    names.insert(names.end(), {longest + "1.mp3", longest + "2.mp3", step + "3.mp3"});
     for (const auto &name : names) {
         add(name);
     }
@@ -205,7 +205,7 @@ TEST_F(ScanTest, AnyNameIsIndexedAndOpensAgain) {
         EXPECT_TRUE(fs::exists(music() + "/" + name)) << name;
     }
     EXPECT_EQ(counts(summaryOf({music()})),
-              "added 0, updated 0, unchanged 13, removed 0, kept 0, failed 0");
+              "added 0, updated 0, unchanged 16, removed 0, kept 0, failed 0");
 }
 
 TEST_F(ScanTest, NamesInMessagesAndJson) {

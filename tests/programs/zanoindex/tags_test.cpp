@@ -168,16 +168,6 @@ TEST_F(TagsTest, DemoMusic) {
     EXPECT_EQ(fs::last_write_time(untitled), before) << "a second call does nothing";
     const auto summary = summaryOf({ZANOINDEX_DEMO});
     EXPECT_EQ(counts(summary), "added 36, updated 0, unchanged 0, removed 0, kept 0, failed 0");
-    const auto lines = songs();
-    for (const char *tags :
-         {"|<img src=x onerror=alert(1)>|", "|ПЕСНЯ|", "|ΣΊΣΥΦΟΣ|", "|ドライブ|", "|Tip‐Toe|AC‐DC|",
-          "|C:\\Music\\New Folder\\|R.E.M.|", "|100% Proof|Motörhead|", "|Hidden_Track|Björk|",
-          "|She Said \"Hello\" & It's Fine|Beyoncé|", "|Æbler og Øl|Ørsted|",
-          "|Untitled Recording|||||0|0|0"}) {
-        EXPECT_TRUE(std::any_of(lines.begin(), lines.end(), [&](const std::string &line) {
-            return line.find(tags) != std::string::npos;
-        })) << tags;
-    }
 }
 
 }  // namespace

@@ -30,11 +30,6 @@ class WatchTest : public IndexTest {
         }
     }
 
-    Ended stop(int signal) {
-        kill(process_->pid(), signal);
-        return process_->wait();
-    }
-
     std::unique_ptr<Process> process_;
 };
 
@@ -81,7 +76,7 @@ TEST_F(WatchTest, FollowsFilesAndFolders) {
     fs::remove_all(music() + "/renamed");
     await(0, 0, 4);
     EXPECT_EQ(paths(), (Lines{"a/1.mp3", "a/new.ogg", "b/2.mp3", "b/hard.mp3", "b/soft.mp3"}));
-    EXPECT_EQ(stop(SIGINT).status, 0);
+    EXPECT_EQ(process_->stop(SIGINT).status, 0);
 }
 
 TEST_F(WatchTest, NamesWhatItCannotRead) {
@@ -90,7 +85,7 @@ TEST_F(WatchTest, NamesWhatItCannotRead) {
     files::write(music() + "/b.mp3", "no music");
     const auto summary = parsed(process_->readLine());
     EXPECT_EQ(summary["failed"].size(), 1U);
-    const auto ended = stop(SIGTERM);
+    const auto ended = process_->stop(SIGTERM);
     EXPECT_EQ(ended.status, 0);
     EXPECT_NE(ended.err.find("/b.mp3: not an audio file"), std::string::npos) << ended.err;
 }
