@@ -1,13 +1,17 @@
+#include <libxml/entities.h>
 #include <libxml/parser.h>
 #include <libxml/tree.h>
 #include <vorelix/upnp/dmaparser.h>
 
 #include <algorithm>
 #include <cstdlib>
+#include <cstring>
 #include <limits>
 #include <memory>
 #include <new>
 #include <string_view>
+#include <utility>
+#include <vector>
 
 namespace {
 
@@ -31,12 +35,28 @@ const char *textOf(const xmlChar *text) {
     return text != nullptr ? reinterpret_cast<const char *>(text) : "";
 }
 
-/* Of the first child alone: an element without text in front of its own children has none. Nor has
- * an entity: a long one that is used often would grow beyond all that was sent. */
-const char *contentOf(const xmlNode *child) {
-    const bool isText = child != nullptr && child->type != XML_ENTITY_REF_NODE;
-    return isText ? textOf(child->content) : "";
+bool isNamed(const xmlNode &node, std::string_view name) {
+    return textOf(node.name) == name;
 }
+
+/* What may still be taken through entities: a few lines of them, each of which names another ten
+ * times, would grow beyond memory and time. Once something is too much, nothing is left. */
+class Allowance {
+  public:
+    explicit Allowance(std::size_t bytes) : left_(bytes) {}
+
+    bool spend(std::size_t bytes) {
+        const bool enough = bytes <= left_;
+        left_ = enough ? left_ - bytes : 0;
+        return enough;
+    }
+
+    /* The text itself, or "" when it is too long. */
+    const char *spendOn(const char *text) { return spend(strnlen(text, left_ + 1)) ? text : ""; }
+
+  private:
+    std::size_t left_;
+};
 
 /* As strtol gives it where a long has 32 bits. */
 int numberOf(const char *text) {
@@ -45,12 +65,167 @@ int numberOf(const char *text) {
         std::clamp<long>(number, std::numeric_limits<int>::min(), std::numeric_limits<int>::max()));
 }
 
-void addAttributes(ItemNode &node, const xmlNode &element) {
-    for (const xmlAttr *attribute = element.properties; attribute != nullptr;
-         attribute = attribute->next) {
-        node.emplace(textOf(attribute->name), contentOf(attribute->children));
+/* libxml2 copies the namespaces of every element, also those that a document type fills in: one of
+ * them may be longer than all the rest of the text, and none is wanted here. */
+class DocumentReader {
+  public:
+    DocumentReader(const char *buffer, int length)
+        : buffer_(buffer), length_(length), allowance_(kBytesInUtf8 * std::max(length, 0)) {}
+
+    /* As xmlReadMemory does it. */
+    std::unique_ptr<xmlDoc, FreeDocument> read() {
+        const std::unique_ptr<xmlParserCtxt, FreeContext> context(xmlNewParserCtxt());
+        if (context == nullptr) {
+            return nullptr;
+        }
+        context->_private = this;
+        startElement_ = std::exchange(context->sax->startElementNs, start);
+        return std::unique_ptr<xmlDoc, FreeDocument>(
+            xmlCtxtReadMemory(context.get(), buffer_, length_, "noname.xml", nullptr, 0));
     }
-}
+
+  private:
+    struct FreeContext {
+        void operator()(xmlParserCtxt *context) const { xmlFreeParserCtxt(context); }
+    };
+
+    static constexpr std::size_t kBytesInUtf8 = 2;  // at most, of each byte of a text
+
+    static void start(void *context, const xmlChar *name, const xmlChar *prefix, const xmlChar *uri,
+                      int namespaceCount, const xmlChar **namespaces, int attributeCount,
+                      int defaultedCount, const xmlChar **attributes) {
+        auto &reader =
+            *static_cast<DocumentReader *>(static_cast<xmlParserCtxt *>(context)->_private);
+        bool isEnough = true;
+        for (int i = 0; i < namespaceCount; ++i) {
+            isEnough = reader.allowance_.spend(std::strlen(textOf(namespaces[2 * i + 1])));
+        }
+        reader.startElement_(context, name, prefix, uri, isEnough ? namespaceCount : 0, namespaces,
+                             attributeCount, defaultedCount, attributes);
+    }
+
+    const char *buffer_;
+    int length_;
+    Allowance allowance_;
+    startElementNsSAX2Func startElement_ = nullptr;
+};
+
+/* Fills the lists of a parser from a tree. A reference to an entity is a node whose children are
+ * the declaration and, as its siblings, those that follow it in the document; below each of them
+ * stands what the entity holds. */
+class Walk {
+  public:
+    Walk(DMAParser &parser, std::size_t allowance) : parser_(parser), allowance_(allowance) {}
+
+    /* Of a node, its following siblings and all that is below them. On a stack of its own, for
+     * entities may lead round in a circle until the allowance is spent. */
+    void siblings(xmlNode *first) {
+        std::vector<Place> places{{first, false}};
+        while (!places.empty()) {
+            const Place place = places.back();
+            places.pop_back();
+            if (place.node == nullptr || (place.inEntity && !allowance_.spend(kShortestItem))) {
+                continue;
+            }
+            places.push_back({place.node->next, place.inEntity});
+            if (!take(place)) {
+                const bool isReference = place.node->type == XML_ENTITY_REF_NODE;
+                places.push_back({place.node->children, place.inEntity || isReference});
+            }
+        }
+    }
+
+    void item(ItemList &list, const xmlNode &element, bool inEntity) {
+        auto node = std::make_unique<ItemNode>();
+        if (isNamed(element, "res") && element.children != nullptr) {
+            add(*node, "res", element.children, inEntity);
+        }
+        if (element.type == XML_ELEMENT_NODE) {
+            for (const xmlAttr *attribute = element.properties; attribute != nullptr;
+                 attribute = attribute->next) {
+                add(*node, textOf(attribute->name), attribute->children, inEntity);
+            }
+        }
+        // The children of a reference are declarations: no element is among them.
+        if (element.type != XML_ENTITY_REF_NODE) {
+            addChildren(*node, element.children, inEntity);
+        }
+        list.push_back(node.get());
+        static_cast<void>(node.release());
+    }
+
+  private:
+    struct Place {
+        xmlNode *node;
+        bool inEntity;
+    };
+
+    static constexpr std::size_t kShortestItem = std::string_view("<item/>").size();
+
+    /* Intended and kept: a node is known by its name, of whatever type it is. false: it is none of
+     * those that are taken whole. */
+    bool take(const Place &place) {
+        const xmlNode &node = *place.node;
+        const std::string_view name = textOf(node.name);
+        if (name == "container") {
+            item(*parser_.containers, node, place.inEntity);
+        } else if (name == "item") {
+            item(*parser_.items, node, place.inEntity);
+        } else if (name == "TotalMatches" || name == "NumberReturned") {
+            // Intended and kept: both counts come into one member, the later one stays.
+            if (node.children != nullptr) {
+                parser_.totalMatches = numberOf(contentOf(node.children, place.inEntity));
+            }
+        } else {
+            return false;
+        }
+        return true;
+    }
+
+    void addChildren(ItemNode &node, const xmlNode *first, bool inEntity) {
+        for (const xmlNode *child = first; child != nullptr; child = child->next) {
+            if (child->type != XML_ELEMENT_NODE) {
+                continue;
+            }
+            if (inEntity && !allowance_.spend(kShortestItem)) {
+                return;
+            }
+            if (!isNamed(*child, "res")) {
+                add(node, textOf(child->name), child->children, inEntity);
+                continue;
+            }
+            if (node.children == nullptr) {
+                node.iniChildList();
+            }
+            item(*node.children, *child, inEntity);
+        }
+    }
+
+    void add(ItemNode &node, const char *name, const xmlNode *child, bool inEntity) {
+        if (!inEntity || allowance_.spend(std::strlen(name))) {
+            node.try_emplace(name, contentOf(child, inEntity));
+        }
+    }
+
+    /* Of the first child alone: an element without text in front of its own children has none. */
+    const char *contentOf(const xmlNode *child, bool inEntity) {
+        if (child == nullptr) {
+            return "";
+        }
+        if (child->type == XML_ENTITY_DECL) {
+            return allowance_.spendOn(textOf(reinterpret_cast<const xmlEntity *>(child)->content));
+        }
+        const char *const content = textOf(child->content);
+        const bool isReference = child->type == XML_ENTITY_REF_NODE;
+        return inEntity || isReference ? allowance_.spendOn(content) : content;
+    }
+
+    DMAParser &parser_;
+    Allowance allowance_;
+};
+
+/* For a tree of which nobody says how long its text was. */
+constexpr std::size_t kUsualAllowance = 1 << 20;
 
 }  // namespace
 
@@ -65,8 +240,7 @@ DMAParser::~DMAParser() = default;
 int DMAParser::Parse(const char *buffer, int length) {
     const ParserCleanup cleanup;
     xmlCheckVersion(kLeastVersion);
-    const std::unique_ptr<xmlDoc, FreeDocument> document(
-        xmlReadMemory(buffer, length, "noname.xml", nullptr, 0));
+    const auto document = DocumentReader(buffer, length).read();
     xmlNode *const root = document != nullptr ? xmlDocGetRootElement(document.get()) : nullptr;
     if (root == nullptr) {
         return -1;
@@ -74,7 +248,7 @@ int DMAParser::Parse(const char *buffer, int length) {
     numberReturned = 0;
     totalMatches = 0;
     try {
-        prcXMLNode(root);
+        Walk(*this, static_cast<std::size_t>(length)).siblings(root);
     } catch (const std::bad_alloc &) {
         return -1;
     }
@@ -86,44 +260,9 @@ int DMAParser::Parse(DMABrowse *browse) {
 }
 
 void DMAParser::prcXMLNode(xmlNode *node) {
-    for (; node != nullptr; node = node->next) {
-        const std::string_view name = node->type == XML_ELEMENT_NODE ? textOf(node->name) : "";
-        if (name == "container") {
-            prcItem(containers, node);
-        } else if (name == "item") {
-            prcItem(items, node);
-        } else if (name == "TotalMatches" || name == "NumberReturned") {
-            // Intended and kept: both counts come into one member, the later one stays.
-            if (node->children != nullptr) {
-                totalMatches = numberOf(contentOf(node->children));
-            }
-        } else if (node->type != XML_ENTITY_REF_NODE) {
-            // Entities may refer to entities, ten times each: a walk through a few lines of them
-            // would not end.
-            prcXMLNode(node->children);
-        }
-    }
+    Walk(*this, kUsualAllowance).siblings(node);
 }
 
 void DMAParser::prcItem(ItemList *list, xmlNode *element) {
-    auto node = std::make_unique<ItemNode>();
-    if (std::string_view(textOf(element->name)) == "res" && element->children != nullptr) {
-        node->emplace("res", contentOf(element->children));
-    }
-    addAttributes(*node, *element);
-    for (xmlNode *child = element->children; child != nullptr; child = child->next) {
-        if (child->type != XML_ELEMENT_NODE) {
-            continue;
-        }
-        if (std::string_view(textOf(child->name)) != "res") {
-            node->emplace(textOf(child->name), contentOf(child->children));
-            continue;
-        }
-        if (node->children == nullptr) {
-            node->iniChildList();
-        }
-        prcItem(node->children, child);
-    }
-    list->push_back(node.get());
-    static_cast<void>(node.release());
+    Walk(*this, kUsualAllowance).item(*list, *element, false);
 }

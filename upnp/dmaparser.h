@@ -45,8 +45,8 @@ class VORELIX_API ItemList : public std::list<ItemNode *> {
 /* A container, an item or a resource. The keys are names without their namespace prefix: first the
  * element's attributes ("id", "parentID", "childCount"), then its child elements but `res`
  * ("title", "creator", "class"), whose own attributes are left out. The first value of a key
- * stays. The value is what stands first in the element, its text as a rule; "" when that is
- * nothing, an element or an entity. A resource has its address under "res" and its attributes
+ * stays. The value is what stands first in the element, its text as a rule, or what an entity
+ * declared by the document holds; "" when that is nothing or an element. A resource has its address under "res" and its attributes
  * ("protocolInfo", "size", "duration"). */
 class VORELIX_API ItemNode : public std::map<std::string, std::string> {
   public:
@@ -84,15 +84,17 @@ class VORELIX_API DMAParser {
     /* Reads `length` bytes of XML in which no markup of the DIDL-Lite document is escaped any more,
      * as DMAgent leaves an answer, and adds what they hold to the lists. 0; -1 when they are no XML
      * document, which libxml2 explains on standard error, or when memory runs out: the lists have
-     * then what was added so far. Entities that a document declares are neither fetched nor
-     * looked into. A null buffer gives -1. */
+     * then what was added so far. Nodes are known by their names, processing instructions and
+     * declarations too. Entities that a document declares are looked into as long as they add no
+     * more than `length` bytes, and are empty from there on; nothing is fetched and no file is
+     * read. A null buffer gives -1. */
     int Parse(const char *buffer, int length);
 
     /* Reads the response of a request that was performed, which may not be null. */
     int Parse(DMABrowse *browse);
 
     /* Steps of Parse: add what is found in a node of libxml2, its following siblings and below
-     * them; add a node made from one element to a list. */
+     * them; add a node made from one element to a list. Entities add up to a megabyte here. */
     void prcXMLNode(_xmlNode *node);
     void prcItem(ItemList *list, _xmlNode *element);
 

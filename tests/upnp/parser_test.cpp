@@ -1,8 +1,10 @@
 #include <gtest/gtest.h>
+#include <libxml/xmlmemory.h>
 #include <sys/inotify.h>
 #include <unistd.h>
 #include <vorelix/upnp/dmaparser.h>
 
+#include <cstring>
 #include <filesystem>
 #include <fstream>
 
@@ -141,8 +143,27 @@ TEST(Parser, ReadsTheResponseOfABrowse) {
     EXPECT_EQ(dump(parser), "--\n[0]:\n0: id=1  \n\n[1]:\n\n");
 }
 
-TEST(Parser, LooksIntoNoEntity) {
-    std::string bomb = "<!DOCTYPE a [<!ENTITY e0 \"&#60;item id='e'/&#62;\">";
+TEST(Parser, KnowsNodesOfAnyTypeByTheirName) {
+    EXPECT_EQ(
+        dumpOf("<a><?item x?><!--item--><?container?><item id=\"1\"><?id 2?></item></a><?item?>"),
+        "[0]:\n\n--\n[0]:\n\n[1]:\n0: id=1  \n\n[2]:\n\n");
+    // A declared entity's text is read as markup where it stands by itself, as it is in a value.
+    const std::string declared =
+        "<!DOCTYPE a [<!ELEMENT item (#PCDATA)><!ENTITY t \"Mot&#246;r\">"
+        "<!ENTITY e \"<item id='e'><t>&t;</t></item>\"><!ENTITY TotalMatches \"7\">"
+        "<!ENTITY item \"<t>x</t>\">]>";
+    EXPECT_EQ(dumpOf(declared + "<a>&e;</a>"),
+              "--\n[0]:\n0: id=e  \n1: t=Mot\u00f6r  \n\n[1]:\n\n");
+    EXPECT_EQ(dumpOf(declared + "<item id=\"&t;\"><t>&t;</t><u>x&t;</u></item>"),
+              "--\n[0]:\n0: id=Mot\u00f6r  \n1: t=Mot\u00f6r  \n2: u=x  \n\n");
+    EXPECT_EQ(dumpOf(declared + "<a>&item;</a>"), "--\n[0]:\n\n");
+    Parser parser;
+    ASSERT_EQ(parser.parse(declared + "<a>&TotalMatches;</a>"), 0);
+    EXPECT_EQ(parser.totalMatches, 7);
+}
+
+TEST(Parser, TakesNoMoreThroughEntitiesThanWasSent) {
+    std::string bomb = "<!DOCTYPE a [<!ENTITY e0 \"<item id='e'/>\">";
     for (int i = 1; i < 20; ++i) {
         bomb += "<!ENTITY e" + std::to_string(i) + " \"";
         for (int k = 0; k < 10; ++k) {
@@ -150,13 +171,52 @@ TEST(Parser, LooksIntoNoEntity) {
         }
         bomb += "\">";
     }
-    EXPECT_EQ(dumpOf(bomb + "]><a>&e1;<item id=\"1\">&e1;</item></a>"), "--\n[0]:\n0: id=1  \n\n");
     testing::internal::CaptureStderr();
+    Parser few;
+    ASSERT_EQ(few.parse(bomb + "]><a>&e1;<item id=\"1\"/></a>"), 0);
+    EXPECT_LE(few.items->size(), bomb.size() / 7);
+    EXPECT_EQ(few.items->front()->getValueByKey("id"), "e");
+    EXPECT_EQ(few.items->back()->getValueByKey("id"), "1");
+    few.parse(bomb + "]><a>&e19;<item id=\"&e19;\"/></a>");
+    few.parse("<!DOCTYPE a [<!ENTITY a \"&b;\"><!ENTITY b \"&a;\">]><a>&a;<item>&b;</item></a>");
+    // Each declaration leads on to the next, and that one back to the first.
+    few.parse("<!DOCTYPE a [<!ENTITY a \"<x/>\"><!ENTITY b \"&a;\">]><a>&b;&a;</a>");
+
+    const std::string text(10000, 'x');
+    std::string longOnes = "<!DOCTYPE a [<!ENTITY e \"" + text + "\">]><a>";
+    for (int i = 0; i < 1000; ++i) {
+        longOnes += "<item id=\"&e;\"/>";
+    }
     Parser parser;
-    parser.parse(bomb + "]><a>&e19;<item id=\"&e19;\"/></a>");
-    parser.parse("<!DOCTYPE a [<!ENTITY a \"&b;\"><!ENTITY b \"&a;\">]><a>&a;<item>&b;</item></a>");
-    EXPECT_LE(parser.items->size(), 2U);
+    ASSERT_EQ(parser.parse(longOnes + "</a>"), 0);
     testing::internal::GetCapturedStderr();
+    EXPECT_EQ(parser.items->size(), 1000U);
+    EXPECT_EQ(parser.items->front()->getValueByKey("id"), text);
+    EXPECT_EQ(parser.items->back()->getValueByKey("id"), "");
+}
+
+TEST(Parser, KeepsNoCopiesOfADeclaredNamespace) {
+    std::string text =
+        "<!DOCTYPE a [<!ATTLIST item xmlns:q CDATA \"" + std::string(100000, 'x') + "\">]><a>";
+    for (int i = 0; i < 20000; ++i) {
+        text += "<item q:id=\"1\"><q:t>x</q:t></item>";
+    }
+    Parser parser;
+    static int copies;
+    copies = 0;
+    const auto allocate = [](std::size_t size) {
+        copies += size > 100000 ? 1 : 0;
+        return std::malloc(size);
+    };
+    testing::internal::CaptureStderr();
+    xmlGcMemSetup(std::free, allocate, allocate, std::realloc, strdup);
+    const int result = parser.parse(text + "</a>");
+    xmlGcMemSetup(std::free, std::malloc, std::malloc, std::realloc, strdup);
+    testing::internal::GetCapturedStderr();
+    ASSERT_EQ(result, 0);
+    EXPECT_LT(copies, 100);
+    EXPECT_EQ(parser.items->size(), 20000U);
+    EXPECT_EQ(parser.items->back()->getValueByKey("t"), "x");
 }
 
 TEST(Parser, FetchesNothingAndOpensNoFile) {
