@@ -70,7 +70,9 @@ int numberOf(const char *text) {
 class DocumentReader {
   public:
     DocumentReader(const char *buffer, int length)
-        : buffer_(buffer), length_(length), allowance_(kBytesInUtf8 * std::max(length, 0)) {}
+        : buffer_(buffer),
+          length_(length),
+          allowance_(kBytesInUtf8 * static_cast<std::size_t>(std::max(length, 0))) {}
 
     /* As xmlReadMemory does it. */
     std::unique_ptr<xmlDoc, FreeDocument> read() {
