@@ -25,7 +25,7 @@ class Cursor {
     /* Writes the next row whole, with 0 and "" in what was not selected; false: none is left. */
     virtual bool next(ZANO_MEDIA_INFO &row) = 0;
 
-    /* The rows of the query without offset and limit; counts them without fetching them. */
+    /* The rows of a query without offset and limit; counts them without fetching them. */
     virtual std::int64_t countAll() = 0;
 
   protected:

@@ -1,13 +1,16 @@
 #include <zanoplatform/error.h>
 
 #include <algorithm>
+#include <array>
 #include <cstdlib>
+#include <memory>
 #include <span>
 #include <unordered_map>
 #include <utility>
 
 #include "../query/statements.h"
 #include "check.h"
+#include "common_grams.h"
 #include "engine.h"
 #include "plan.h"
 #include "songs.h"
@@ -23,6 +26,12 @@ constexpr size_t kSongsAtOnce = 1000;
 constexpr size_t kSongsHeld = 20000;
 /* The planner's numbers are made anew when a fifth of the songs has come or gone. */
 constexpr std::int64_t kRecountShare = 5;
+/* So many songs tell which trigrams are common: those of more than a few songs, or of more than one
+ * in a thousand. */
+constexpr double kSongsSampled = 50000;
+constexpr std::int64_t kFewSongs = 200;
+constexpr std::int64_t kFewShare = 1000;
+constexpr std::array kSearched = {Column::Title, Column::Artist, Column::Album, Column::Genre};
 /* Held by who sets anchors; any number that all programs of this kind use. */
 constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
 constexpr const char *kUnlockAnchors = "SELECT pg_advisory_unlock(1517118562, 2)";
@@ -371,8 +380,42 @@ class PostgresqlCatalogue : public Catalogue {
             connection_.run(sql.bind(kAnchorDistance).add("=0"));
             step();
         }
+        countGrams();
         setState("anchored", generation);
         close();
+    }
+
+    /* Of some of the songs, at random: what repeats with their ids must not mislead. */
+    void countGrams() {
+        const std::int64_t songs = connection_.integer(newSql("SELECT count(*) FROM ordered"));
+        const double share =
+            std::min(1.0, kSongsSampled / static_cast<double>(std::max<std::int64_t>(songs, 1)));
+        Sql sample = newSql("DECLARE files NO SCROLL CURSOR FOR SELECT ");
+        std::string_view separator;
+        std::array<std::string_view, 4> keys;
+        std::transform(kSearched.begin(), kSearched.end(), keys.begin(),
+                       [](Column column) { return columnInfo(column).key; });
+        for (const std::string_view key : keys) {
+            sample.add(separator).add(key);
+            separator = ", ";
+        }
+        sample.add(" FROM songs WHERE random()<").bind(share);
+        connection_.run(sample);
+        const auto counts = std::make_unique<std::array<GramCounts, keys.size()>>();
+        for (Result rows = nextFiles(); rows.size() > 0; rows = nextFiles()) {
+            for (int i = 0; i < rows.size(); ++i) {
+                for (size_t column = 0; column < keys.size(); ++column) {
+                    (*counts)[column].add(rows[i].text(static_cast<int>(column)));
+                }
+            }
+        }
+        connection_.run(std::string("CLOSE files; DELETE FROM grams"));
+        const auto few = static_cast<double>(std::max(kFewSongs, songs / kFewShare)) * share;
+        for (size_t column = 0; column < keys.size(); ++column) {
+            Sql sql = newSql("INSERT INTO grams VALUES(").bind(std::string(keys[column])).add(",");
+            connection_.run(
+                sql.bind((*counts)[column].commonOnes(static_cast<std::int64_t>(few))).add(")"));
+        }
     }
 
     /* Without them the server would guess how often words come. Vacuuming lets it answer counts

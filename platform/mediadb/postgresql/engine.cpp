@@ -43,17 +43,17 @@ class BaseCursor : public Cursor {
     int at_ = 0;
 };
 
-/* The rows of one statement. It does not run before the first row is asked for, since some
- * callers want the count alone. */
+/* The rows of one statement: a page, which is here at once, or everything, which comes piece by
+ * piece and begins when its first row is asked for, since some callers want the count alone. */
 class StatementCursor : public BaseCursor {
   public:
     StatementCursor(ReaderPool::Lease lease, Query asked)
-        : BaseCursor(std::move(lease), std::move(asked)), sql_(dialect()) {}
+        : BaseCursor(std::move(lease), std::move(asked)), listing_(dialect()) {}
 
     bool next(ZANO_MEDIA_INFO &row) override {
         Connection &server = connection();  // refused in a forked child, also when rows are left
-        if (!hasRow() && !isDone_) {
-            isDone_ = true;  // also when it fails
+        if (!hasRow() && hasMore_) {
+            hasMore_ = false;  // also when it fails
             fetch(server);
         }
         if (hasRow()) {
@@ -66,58 +66,94 @@ class StatementCursor : public BaseCursor {
   protected:
     bool isPiecewise() const { return query().limit == 0 || query().limit > kRowsAtOnce; }
 
-    /* Prepares too, so that a text that the engine refuses fails when the query is opened. */
-    void setSql(const Sql &sql, Connection::Plan plan = Connection::Plan::ForValues) {
-        sqlPlan_ = plan;
-        sql_ = newSql(isPiecewise() ? "DECLARE listing NO SCROLL CURSOR FOR " : "");
-        sql_.append(sql);
-        connection().check(sql_);
+    /* Within a snapshot. Prepares too, so that a text that the engine refuses fails when the query
+     * is opened. */
+    void setListing(const Sql &sql) {
+        listing_.add("DECLARE listing NO SCROLL CURSOR FOR ").append(sql);
+        connection().check(listing_);
+        hasMore_ = true;
     }
 
   private:
     void fetch(Connection &server) {
-        if (!isPiecewise()) {
-            setRows(server.run(sql_, sqlPlan_));
-            return;
-        }
         if (!isDeclared_) {
-            server.run(sql_);
+            server.run(listing_);
             isDeclared_ = true;
         }
         setRows(server.runOnce(kFetch));
-        isDone_ = !hasRow();
+        hasMore_ = hasRow();
     }
 
-    Sql sql_;
-    Connection::Plan sqlPlan_ = Connection::Plan::ForValues;
+    Sql listing_;
+    bool hasMore_ = false;
     bool isDeclared_ = false;
-    bool isDone_ = false;
 };
+
+/* The rows of a statement that one message can ask for. Where the songs have changed meanwhile, it
+ * may have to be another one, of a snapshot. */
+template <typename MakeStatement>
+Result answerOf(Reader &reader, const std::optional<Expression> &condition,
+                const MakeStatement &make) {
+    {
+        SongPlan plan(reader, condition);
+        const Statement statement = make(plan);
+        if (auto rows = reader.answer(statement)) {
+            return std::move(*rows);
+        }
+    }
+    reader.beginSnapshot();
+    SongPlan plan(reader, condition);
+    const Statement statement = make(plan);
+    return reader.connection().run(statement.sql, statement.plan);
+}
 
 class SongCursor : public StatementCursor {
   public:
     SongCursor(ReaderPool::Lease lease, Query asked)
-        : StatementCursor(std::move(lease), std::move(asked)), plan_(reader(), query().condition) {
-        if (const auto facets = plan_.facetPage(query())) {
-            setSql(*facets, Connection::Plan::Kept);
+        : StatementCursor(std::move(lease), std::move(asked)) {
+        if (isPiecewise()) {
+            beginListing();
         } else {
-            setSql(
-                query().distinct ? plan_.distinctPage(query()) : plan_.page(query()),
-                plan_.isPlanKept(query()) ? Connection::Plan::Kept : Connection::Plan::ForValues);
+            setRows(answerOf(reader(), query().condition,
+                             [this](SongPlan &plan) { return plan.page(query()); }));
         }
     }
 
-    std::int64_t countAll() override { return plan_.count(query().distinct); }
+    std::int64_t countAll() override {
+        return total_ ? *total_ : SongPlan(reader(), query().condition).count(query().distinct);
+    }
 
   private:
-    SongPlan plan_;
+    /* A list of everything is asked for its length first, which comes with the snapshot. */
+    void beginListing() {
+        const bool isWhole = query().offset == 0 && query().limit == 0;
+        std::optional<SongPlan> plan(std::in_place, reader(), query().condition);
+        const auto count = isWhole ? plan->countStatement(query().distinct) : std::nullopt;
+        if (!count) {
+            reader().beginSnapshot();
+        } else if (const auto rows = reader().beginSnapshot(*count)) {
+            total_ = (*rows)[0].integer(0);
+        }
+        if (!total_) {
+            plan.emplace(reader(), query().condition);  // of the state that it is now
+        }
+        setListing(plan->page(query()).sql);
+    }
+
+    std::optional<std::int64_t> total_;
 };
 
 class PlaylistCursor : public StatementCursor {
   public:
     PlaylistCursor(ReaderPool::Lease lease, Query asked)
         : StatementCursor(std::move(lease), std::move(asked)) {
-        setSql(playlistPage(dialect(), columnList(query().select, ""), query()));
+        reader().beginSnapshot();
+        const Sql sql = playlistPage(dialect(), columnList(query().select, ""), query());
+        if (isPiecewise()) {
+            setListing(sql);
+        } else {
+            setRows(connection().run(sql));
+        }
     }
 
     std::int64_t countAll() override {
@@ -130,8 +166,11 @@ class DrawingCursor : public BaseCursor {
   public:
     DrawingCursor(ReaderPool::Lease lease, Query asked)
         : BaseCursor(std::move(lease), std::move(asked)), random_(std::random_device{}()) {
-        first_ = connection().integer(newSql("SELECT min(id) FROM songs"));
-        last_ = connection().integer(newSql("SELECT max(id) FROM songs"));
+        reader().beginSnapshot();
+        const Result ends = connection().run(
+            newSql("SELECT (SELECT min(id) FROM songs), (SELECT max(id) FROM songs)"));
+        first_ = ends[0].integer(0);
+        last_ = ends[0].integer(1);
         const std::int64_t songs = reader().state().songs;
         left_ = std::clamp<std::int64_t>(songs - query().offset, 0, query().limit);
         /* Drawing again when an id is free or was drawn takes few tries then. */
@@ -191,16 +230,16 @@ class PostgresqlEngine : public Engine {
             query.condition = typedCondition(std::move(*query.condition));
         }
         if (query.table == Table::Playlists) {
-            return std::make_unique<PlaylistCursor>(pool_->lease(), std::move(query));
+            return opened<PlaylistCursor>(query);
         }
         if (query.random && !query.distinct && query.limit > 0 &&
             conjunctsOf(query.condition).empty()) {
-            auto drawing = std::make_unique<DrawingCursor>(pool_->lease(), query);
+            auto drawing = opened<DrawingCursor>(query);
             if (drawing->isFit()) {
                 return drawing;
             }
         }
-        return std::make_unique<SongCursor>(pool_->lease(), std::move(query));
+        return opened<SongCursor>(query);
     }
 
     std::int64_t count(const CountQuery &asked) override {
@@ -210,12 +249,13 @@ class PostgresqlEngine : public Engine {
         if (asked.condition) {
             query.condition = typedCondition(*asked.condition);
         }
-        auto lease = pool_->lease();
-        if (query.table == Table::Songs) {
-            return SongPlan(*lease, query.condition).count(query.distinct);
-        }
         query.select = {{Column::Id, Column::Id}};
-        return PlaylistCursor(std::move(lease), std::move(query)).countAll();
+        return pool_->serve([&query](ReaderPool::Lease lease) {
+            if (query.table == Table::Playlists) {
+                return PlaylistCursor(std::move(lease), query).countAll();
+            }
+            return countSongs(*lease, query);
+        });
     }
 
     /* The row of the path is looked for first, since a refused insertion uses up an id. */
@@ -261,6 +301,24 @@ class PostgresqlEngine : public Engine {
     }
 
   private:
+    template <typename AnyCursor>
+    std::unique_ptr<AnyCursor> opened(const Query &query) {
+        return pool_->serve([&query](ReaderPool::Lease lease) {
+            return std::make_unique<AnyCursor>(std::move(lease), query);
+        });
+    }
+
+    static std::int64_t countSongs(Reader &reader, const Query &query) {
+        if (const auto statement =
+                SongPlan(reader, query.condition).countStatement(query.distinct)) {
+            if (const auto rows = reader.answer(*statement)) {
+                return (*rows)[0].integer(0);
+            }
+        }
+        reader.beginSnapshot();
+        return SongPlan(reader, query.condition).count(query.distinct);
+    }
+
     static std::vector<std::string> playlistValues(const ZANO_MEDIA_INFO &row) {
         const std::string title(fieldText(row.title));
         const std::string album(fieldText(row.album));

@@ -1,8 +1,8 @@
-/* libpq's handles as objects. Failures throw DatabaseError
- * with the server's own words. */
+/* libpq's handles as objects. Failures throw DatabaseError with the server's own words. */
 #pragma once
 
 #include <cstdint>
+#include <initializer_list>
 #include <map>
 #include <memory>
 #include <optional>
@@ -31,6 +31,12 @@ class ServerError : public DatabaseError {
     std::string state_;
 };
 
+/* The server is gone, and the connection of no more use. */
+class LostConnection : public ServerError {
+  public:
+    using ServerError::ServerError;
+};
+
 /* One row of a result, which must outlive it. */
 class Row {
   public:
@@ -51,6 +57,7 @@ class Result {
     explicit Result(PGresult *result) : result_(result) {}
 
     PGresult *get() const { return result_.get(); }
+    PGresult *release() { return result_.release(); }
     int size() const { return libpq().ntuples(result_.get()); }
     Row operator[](int row) const { return {result_.get(), row}; }
 
@@ -113,6 +120,10 @@ class Connection {
         usePlan(plan);
         return execute(prepare(sql.text()), sql.values());
     }
+    /* Statements without values and then one with, in one message to the server; all their results.
+     * They are a transaction of their own, unless they begin one that stays. */
+    std::vector<Result> runTogether(std::initializer_list<std::string> first, const Sql &sql,
+                                    Plan plan);
     /* Without waiting for the end of it, or ever looking at it; the next statement waits. */
     void runLater(const char *sql);
     /* "COPY table(columns) FROM STDIN", any number of rows for it, and their end. What the server
@@ -126,9 +137,11 @@ class Connection {
     /* Under which the server knows a statement from now until the next one is prepared. */
     const std::string &nameOf(const std::string &sql) { return prepare(sql).name; }
     /* The first column of the first row; `fallback` when there is none. */
-    std::int64_t integer(const Sql &sql, std::int64_t fallback = 0);
+    std::int64_t integer(const Sql &sql, Plan plan = Plan::ForValues, std::int64_t fallback = 0);
 
-    bool isBroken() const { return libpq().status(connection_.get()) != CONNECTION_OK; }
+    bool isBroken() const {
+        return isOutOfStep_ || libpq().status(connection_.get()) != CONNECTION_OK;
+    }
 
   private:
     struct Finish {
@@ -140,16 +153,23 @@ class Connection {
         std::vector<Oid> types;
     };
 
+    void makeRoom(size_t statements);
     const Prepared &prepare(const std::string &sql);
     Result execute(const Prepared &statement, const std::vector<Value> &values);
+    void send(const Prepared &statement, const std::vector<Value> &values);
+    void require(bool isSent);
+    void awaitIdle();
+    std::vector<Result> takeResults(size_t count);
+    static std::string planSetting(Plan plan);
     void usePlan(Plan plan);
     Result checked(PGresult *result);
     [[noreturn]] void throwErrorOf(const PGresult *result);
     void applySettings(Access access);
 
     std::unique_ptr<PGconn, Finish> connection_;
-    std::map<std::string, Prepared, std::less<>> prepared_;
+    std::map<std::string, Prepared> prepared_;  // stay where they are
     std::uint64_t names_ = 0;
+    bool isOutOfStep_ = false;
     bool knowsPlans_ = false;   // the server has a setting for them
     std::optional<Plan> plan_;  // of the setting; null: not known
 };

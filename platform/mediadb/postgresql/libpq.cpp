@@ -45,6 +45,11 @@ Libpq load() {
     find(library, "PQexec", made.exec);
     find(library, "PQexecParams", made.execParams);
     find(library, "PQsendQuery", made.sendQuery);
+    find(library, "PQsendQueryPrepared", made.sendQueryPrepared);
+    find(library, "PQgetResult", made.getResult);
+    find(library, "PQenterPipelineMode", made.enterPipelineMode);
+    find(library, "PQpipelineSync", made.pipelineSync);
+    find(library, "PQexitPipelineMode", made.exitPipelineMode);
     find(library, "PQprepare", made.prepare);
     find(library, "PQdescribePrepared", made.describePrepared);
     find(library, "PQnparams", made.nparams);

@@ -20,6 +20,11 @@ struct Libpq {
     decltype(&::PQexec) exec;
     decltype(&::PQexecParams) execParams;
     decltype(&::PQsendQuery) sendQuery;
+    decltype(&::PQsendQueryPrepared) sendQueryPrepared;
+    decltype(&::PQgetResult) getResult;
+    decltype(&::PQenterPipelineMode) enterPipelineMode;
+    decltype(&::PQpipelineSync) pipelineSync;
+    decltype(&::PQexitPipelineMode) exitPipelineMode;
     decltype(&::PQprepare) prepare;
     decltype(&::PQdescribePrepared) describePrepared;
     decltype(&::PQnparams) nparams;

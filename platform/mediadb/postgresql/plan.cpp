@@ -69,6 +69,7 @@ void addStretch(Sql &sql, const OrderTerm &leading, bool isSameValue, std::int64
 
 SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
     : reader_(reader), conjuncts_(conjunctsOf(condition)) {
+    reader_.state();  // so that what follows is known to be of that state
     /* A prefix that all paths have costs a comparison for each row, and counts would have to
      * look at rows at all. */
     conjuncts_.erase(std::remove_if(conjuncts_.begin(), conjuncts_.end(),
@@ -77,14 +78,31 @@ SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
                                                reader_.allPathsBegin(conjunct.pathPrefix);
                                     }),
                      conjuncts_.end());
+    const auto rare =
+        std::find_if(conjuncts_.begin(), conjuncts_.end(), [&reader](const Conjunct &conjunct) {
+            const auto &terms = conjunct.searches;
+            return !terms.empty() && std::all_of(terms.begin(), terms.end(), [&](const auto &term) {
+                return reader.isRare(term);
+            });
+        });
+    rare_ = rare != conjuncts_.end() ? &*rare : nullptr;
 }
 
-void SongPlan::addWhere(Sql &sql) {
+/* The table and the condition. What only a few songs meet is found first and by itself (OFFSET 0
+ * keeps it apart), for a plan that is kept would not know that they are few. */
+void SongPlan::addSongs(Sql &sql) {
+    sql.add(" FROM ");
+    if (isRare()) {
+        sql.add("(SELECT * FROM songs WHERE ").addCondition(*rare_->expression, "songs.");
+        sql.add(" OFFSET 0) AS ");
+    }
+    sql.add("songs");
     std::string_view word = " WHERE ";
     for (const Conjunct &conjunct : conjuncts_) {
-        sql.add(word);
-        sql.addCondition(*conjunct.expression, "songs.");
-        word = " AND ";
+        if (&conjunct != rare_) {
+            sql.add(word).addCondition(*conjunct.expression, "songs.");
+            word = " AND ";
+        }
     }
 }
 
@@ -130,7 +148,19 @@ std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &que
     return sql;
 }
 
-Sql SongPlan::page(const Query &query) {
+Statement SongPlan::page(const Query &query) {
+    const bool areValues = conjuncts_.empty() && asksForValues(query);
+    if (const Facet *facet = areValues ? findFacet(*query.distinct) : nullptr) {
+        return {valuePage(dialect(), facet->number, query), Connection::Plan::Kept};
+    }
+    if (query.distinct) {
+        return {distinctPage(query)};
+    }
+    const bool isKept = isPlanKept(query) || isRare();
+    return {songPage(query), isKept ? Connection::Plan::Kept : Connection::Plan::ForValues};
+}
+
+Sql SongPlan::songPage(const Query &query) {
     const auto leading = leadingOf(query.order);
     const StoredOrder *stored = leading ? findStoredOrder(*leading) : nullptr;
     if (stored != nullptr) {
@@ -138,8 +168,8 @@ Sql SongPlan::page(const Query &query) {
             return std::move(*deep);
         }
     }
-    Sql sql = newSql("SELECT ").add(columnList(query.select, "songs.")).add(" FROM songs");
-    addWhere(sql);
+    Sql sql = newSql("SELECT ").add(columnList(query.select, "songs."));
+    addSongs(sql);
     sql.add(" ORDER BY ");
     if (query.random) {
         sql.add("random()");
@@ -159,8 +189,7 @@ Sql SongPlan::page(const Query &query) {
 Sql SongPlan::distinctPage(const Query &query) {
     const ColumnInfo &info = columnInfo(*query.distinct);
     Sql sql = newSql("SELECT ").add(columnList(query.select, "songs."));
-    sql.add(" FROM songs WHERE songs.id IN (SELECT min(songs.id) FROM songs");
-    addWhere(sql);
+    addSongs(sql.add(" FROM songs WHERE songs.id IN (SELECT min(songs.id)"));
     sql.add(" GROUP BY songs.").add(info.name).add(") ORDER BY ");
     if (query.random) {
         sql.add("random()");
@@ -173,13 +202,6 @@ Sql SongPlan::distinctPage(const Query &query) {
     }
     sql.addPage(query.offset, query.limit);
     return sql;
-}
-
-std::optional<Sql> SongPlan::facetPage(const Query &query) {
-    const bool areWanted = conjuncts_.empty() && asksForValues(query);
-    const Facet *facet = areWanted ? findFacet(*query.distinct) : nullptr;
-    return facet != nullptr ? std::optional(valuePage(dialect(), facet->number, query))
-                            : std::nullopt;
 }
 
 std::int64_t SongPlan::countOutside(const std::string &prefix, std::int64_t bound) {
@@ -195,19 +217,11 @@ std::int64_t SongPlan::countOutside(const std::string &prefix, std::int64_t boun
     return outside;
 }
 
-std::int64_t SongPlan::count(std::optional<Column> distinct) {
-    if (conjuncts_.empty() && !distinct) {
-        return reader_.state().songs;
-    }
-    if (conjuncts_.size() == 1 && !conjuncts_[0].pathPrefix.empty() && !distinct) {
-        const auto outside = countOutside(conjuncts_[0].pathPrefix, kOutsideBound);
-        if (outside < kOutsideBound) {
-            return reader_.state().songs - outside;
-        }
-    }
-    const Facet *facet = conjuncts_.empty() ? findFacet(*distinct) : nullptr;
-    if (facet != nullptr) {
-        return *reader_.state().find(facet->state);
+std::optional<Statement> SongPlan::countStatement(std::optional<Column> distinct) {
+    const bool isKnown = conjuncts_.empty() && (!distinct || findFacet(*distinct) != nullptr);
+    const bool isOfPaths = conjuncts_.size() == 1 && !conjuncts_[0].pathPrefix.empty();
+    if (isKnown || (isOfPaths && !distinct)) {
+        return std::nullopt;
     }
     Sql sql = newSql("SELECT count(");
     if (distinct) {
@@ -215,7 +229,25 @@ std::int64_t SongPlan::count(std::optional<Column> distinct) {
     } else {
         sql.add("*)");
     }
-    addWhere(sql.add(" FROM songs"));
+    addSongs(sql);
+    return Statement{sql, isRare() ? Connection::Plan::Kept : Connection::Plan::ForValues};
+}
+
+std::int64_t SongPlan::count(std::optional<Column> distinct) {
+    if (const auto statement = countStatement(distinct)) {
+        return reader_.connection().integer(statement->sql, statement->plan);
+    }
+    if (conjuncts_.empty()) {
+        return distinct ? *State(reader_.state()).find(findFacet(*distinct)->state)
+                        : reader_.state().songs;
+    }
+    const std::string &prefix = conjuncts_[0].pathPrefix;
+    const auto outside = countOutside(prefix, kOutsideBound);
+    if (outside < kOutsideBound) {
+        return reader_.state().songs - outside;
+    }
+    Sql sql = newSql("SELECT count(*)");
+    addSongs(sql);
     return reader_.connection().integer(sql);
 }
 

@@ -1,5 +1,6 @@
 /* Turns a parsed query on the songs into statements. Which index serves a search is left to
- * PostgreSQL, which knows how often words come; deep pages and counts are helped. */
+ * PostgreSQL, which knows how often words come, but for searches that are known to find only a few
+ * songs; deep pages and counts are helped. */
 #pragma once
 
 #include <optional>
@@ -20,25 +21,27 @@ class SongPlan {
     /* `condition`, a typed one, must outlive the plan. */
     SongPlan(Reader &reader, const std::optional<Expression> &condition);
 
-    /* SELECT the columns of one page, in order; random where the query says so. */
-    Sql page(const Query &query);
-    /* The same of the first song of each value of the distinct column. */
-    Sql distinctPage(const Query &query);
+    /* SELECT the columns of one page, in order; random where the query says so; with a distinct
+     * column of the first song of each of its values. */
+    Statement page(const Query &query);
     std::int64_t count(std::optional<Column> distinct);
+    /* Null: it takes several statements, or none. */
+    std::optional<Statement> countStatement(std::optional<Column> distinct);
 
-    /* Whether one plan serves all pages of this kind: the server need not make it anew. */
-    bool isPlanKept(const Query &query) const;
     bool isUnconditional() const { return conjuncts_.empty(); }
-    /* The values of a column, where they are kept and the query asks for nothing else. */
-    std::optional<Sql> facetPage(const Query &query);
 
   private:
-    std::int64_t countOutside(const std::string &prefix, std::int64_t bound);
+    bool isRare() const { return rare_ != nullptr; }
+    bool isPlanKept(const Query &query) const;
+    Sql songPage(const Query &query);
+    Sql distinctPage(const Query &query);
     std::optional<Sql> anchored(const StoredOrder &order, const Query &query);
-    void addWhere(Sql &sql);
+    std::int64_t countOutside(const std::string &prefix, std::int64_t bound);
+    void addSongs(Sql &sql);
 
     Reader &reader_;
     std::vector<Conjunct> conjuncts_;
+    const Conjunct *rare_ = nullptr;  // that only a few songs meet; null: none is known
 };
 
 }  // namespace zano::mediadb::postgresql

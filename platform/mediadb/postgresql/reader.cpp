@@ -11,8 +11,25 @@ namespace zano::mediadb::postgresql {
 namespace {
 
 constexpr const char *kState = "SELECT name, value FROM state";
-constexpr std::string_view kBegin =
-    "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ, READ ONLY; EXECUTE ";
+constexpr const char *kBegin = "BEGIN TRANSACTION ISOLATION LEVEL REPEATABLE READ, READ ONLY";
+
+constexpr const char *kNoRight = "42501";
+
+/* What a database without a media database says. */
+template <typename Work>
+Result withWordsForNoTable(const Work &work) {
+    try {
+        return work();
+    } catch (const ServerError &error) {
+        if (error.state() == "42P01") {
+            throw ServerError(KLIB_ERR_DATABASE_OPEN,
+                              "the PostgreSQL database holds no media database yet; zanoindex "
+                              "makes it",
+                              error.state());
+        }
+        throw;
+    }
+}
 
 }  // namespace
 
@@ -29,75 +46,104 @@ std::int64_t *State::find(std::string_view name) {
     return nullptr;
 }
 
-void Reader::beginSnapshot() {
+/* false: it is as it was. What was kept of the songs goes with their generation. */
+bool Reader::takeState(const Result &rows) {
     State state;
-    try {
-        const Result rows = connection_.run(std::string(kBegin) + connection_.nameOf(kState));
-        for (int i = 0; i < rows.size(); ++i) {
-            if (std::int64_t *value = state.find(rows[i].text(0))) {
-                *value = rows[i].integer(1);
-            }
+    for (int i = 0; i < rows.size(); ++i) {
+        if (std::int64_t *value = state.find(rows[i].text(0))) {
+            *value = rows[i].integer(1);
         }
-    } catch (const ServerError &error) {
-        if (error.state() == "42P01") {
-            throw ServerError(KLIB_ERR_DATABASE_OPEN,
-                              "the PostgreSQL database holds no media database yet; zanoindex "
-                              "makes it",
-                              error.state());
-        }
-        throw;
     }
     requireVersion(state.schema);
-    if (state.generation != state_.generation) {
+    if (state == state_) {
+        return false;
+    }
+    if (!state_ || state.generation != state_->generation || state.anchored != state_->anchored) {
         commonPrefix_.reset();
+        grams_.clear();
     }
     state_ = state;
+    return true;
+}
+
+const State &Reader::state() {
+    if (!state_) {
+        takeState(withWordsForNoTable([this] { return connection_.run(newSql(kState)); }));
+    }
+    return *state_;
+}
+
+void Reader::beginSnapshot() {
+    const std::string begin = std::string(kBegin) + "; EXECUTE ";
+    const Result rows =
+        withWordsForNoTable([&] { return connection_.run(begin + connection_.nameOf(kState)); });
+    isInSnapshot_ = true;
+    takeState(rows);
 }
 
 bool Reader::endSnapshot() noexcept {
     try {
-        connection_.runLater("COMMIT");
-        return true;
+        if (isInSnapshot_) {
+            isInSnapshot_ = false;
+            connection_.runLater("COMMIT");
+        }
+        return !connection_.isBroken();
     } catch (const std::exception &) {
         return false;
     }
+}
+
+std::optional<Result> Reader::answer(const Statement &statement) {
+    auto results = connection_.runTogether({kState}, statement.sql, statement.plan);
+    return takeState(results[0]) ? std::nullopt : std::optional(std::move(results[1]));
+}
+
+std::optional<Result> Reader::beginSnapshot(const Statement &statement) {
+    auto results = connection_.runTogether({kBegin, kState}, statement.sql, statement.plan);
+    isInSnapshot_ = true;
+    return takeState(results[1]) ? std::nullopt : std::optional(std::move(results[2]));
+}
+
+/* A role may have been given its rights before there was the table: then nothing is known. */
+const CommonGrams &Reader::gramsOf(Column column) {
+    if (const auto known = grams_.find(column); known != grams_.end()) {
+        return known->second;
+    }
+    std::string bits;
+    try {
+        Sql sql = newSql("SELECT common FROM grams WHERE key=");
+        const Result rows = connection_.run(sql.bind(std::string(columnInfo(column).key)));
+        bits = rows.size() > 0 ? std::string(rows[0].text(0)) : std::string();
+    } catch (const ServerError &error) {
+        if (error.state() != kNoRight) {
+            throw;
+        }
+    }
+    return grams_.emplace(column, CommonGrams(std::move(bits))).first->second;
+}
+
+bool Reader::isRare(const SearchTerm &term) {
+    const auto &pieces = term.pattern.pieces();
+    const bool mayLook = !isInSnapshot_ || grams_.count(term.column) > 0;
+    return mayLook && std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
+               return piece.kind == Pattern::Piece::Kind::Literal && hasGram(piece.text) &&
+                      gramsOf(term.column).hasRareIn(piece.text);
+           });
 }
 
 /* Nearly always true of the music root. What all paths begin with is what the first and the last
  * of them have in common. */
 bool Reader::allPathsBegin(const std::string &prefix) {
     if (!commonPrefix_) {
-        const Result first =
-            connection_.run(newSql("SELECT path FROM songs ORDER BY path LIMIT 1"));
-        const Result last =
-            connection_.run(newSql("SELECT path FROM songs ORDER BY path DESC LIMIT 1"));
-        std::string common;
-        if (first.size() > 0 && last.size() > 0) {
-            const std::string_view a = first[0].text(0);
-            const std::string_view b = last[0].text(0);
-            common.assign(a.begin(), std::mismatch(a.begin(), a.end(), b.begin(), b.end()).first);
-        }
-        commonPrefix_ = std::move(common);
+        const Result ends =
+            connection_.run(newSql("SELECT (SELECT path FROM songs ORDER BY path LIMIT 1), "
+                                   "(SELECT path FROM songs ORDER BY path DESC LIMIT 1)"));
+        const std::string_view a = ends[0].text(0);
+        const std::string_view b = ends[0].text(1);
+        commonPrefix_.emplace(a.begin(),
+                              std::mismatch(a.begin(), a.end(), b.begin(), b.end()).first);
     }
     return commonPrefix_->compare(0, prefix.size(), prefix) == 0;
-}
-
-/* An idle connection may have lost its server, which shows when it is used; another host may be
- * there in its place. */
-ReaderPool::Lease ReaderPool::lease() {
-    while (auto reader = idle_.take()) {
-        try {
-            reader->beginSnapshot();
-            return {shared_from_this(), std::move(reader)};
-        } catch (const DatabaseError &) {
-            if (!reader->connection().isBroken()) {
-                throw;
-            }
-        }
-    }
-    auto reader = std::make_unique<Reader>(uri_);
-    reader->beginSnapshot();
-    return {shared_from_this(), std::move(reader)};
 }
 
 void ReaderPool::giveBack(std::unique_ptr<Reader> reader) noexcept {

@@ -2,12 +2,15 @@
  * costs more than reading a page. A result that its caller never closes keeps its connection. */
 #pragma once
 
+#include <map>
 #include <memory>
 #include <optional>
 #include <string>
 #include <utility>
 
+#include "../query/analysis.h"
 #include "../reader_lease.h"
+#include "common_grams.h"
 #include "handle.h"
 
 namespace zano::mediadb::postgresql {
@@ -24,26 +27,46 @@ struct State {
 
     /* By the name of the row; null for one that readers do not need. */
     std::int64_t *find(std::string_view name);
+    bool operator==(const State &) const = default;
+};
+
+/* A statement and whether one plan serves it whatever its values. */
+struct Statement {
+    Sql sql;
+    Connection::Plan plan = Connection::Plan::ForValues;
 };
 
 class Reader {
   public:
     explicit Reader(const std::string &uri) : connection_(uri, Connection::Access::Read) {}
 
-    /* Everything read between the two is of one moment. */
+    /* Everything read from now on is of one moment, until the reader goes back to its pool. */
     void beginSnapshot();
+    /* The rows of one statement that was made for state(), before a snapshot is begun, and with
+     * one. Null: the catalogue has changed since, and state() is another now. */
+    std::optional<Result> answer(const Statement &statement);
+    std::optional<Result> beginSnapshot(const Statement &statement);
     /* false: the connection is of no more use. */
     bool endSnapshot() noexcept;
 
     Connection &connection() { return connection_; }
-    State &state() { return state_; }
+    /* Of the snapshot; before one is begun, of some moment before. */
+    const State &state();
     /* Whether the path of every song begins so. */
     bool allPathsBegin(const std::string &prefix);
+    /* Whether no more than a few songs can be among the results of a search. */
+    bool isRare(const SearchTerm &term);
 
   private:
+    bool takeState(const Result &rows);
+    const CommonGrams &gramsOf(Column column);
+
     Connection connection_;
-    State state_;
-    std::optional<std::string> commonPrefix_;  // of the paths at state_.generation
+    std::optional<State> state_;
+    bool isInSnapshot_ = false;
+    /* Of the songs at that generation. */
+    std::optional<std::string> commonPrefix_;
+    std::map<Column, CommonGrams> grams_;
 };
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
@@ -52,7 +75,19 @@ class ReaderPool : public std::enable_shared_from_this<ReaderPool> {
 
     explicit ReaderPool(std::string uri) : uri_(std::move(uri)) {}
 
-    Lease lease();
+    /* What `work` makes of a reader. An idle connection may have lost its server, which shows when
+     * it is used; another host may be there in its place. */
+    template <typename Work>
+    auto serve(const Work &work) {
+        while (auto reader = idle_.take()) {
+            try {
+                return work(Lease(shared_from_this(), std::move(reader)));
+            } catch (const LostConnection &) {
+                continue;
+            }
+        }
+        return work(Lease(shared_from_this(), std::make_unique<Reader>(uri_)));
+    }
 
   private:
     friend Lease;

@@ -49,6 +49,12 @@ INSERT INTO zano.state VALUES('schema', 1), ('songs', 0), ('generation', 0), ('a
 CREATE FUNCTION zano.zano_text(bytea) RETURNS text LANGUAGE plpgsql IMMUTABLE STRICT AS
     'BEGIN RETURN convert_from($1, ''UTF8'');
      EXCEPTION WHEN OTHERS THEN RETURN convert_from($1, ''LATIN1''); END';
+)sql",
+                                                                  /* Anchors are set anew with the
+                                                                     first trigrams. */
+                                                                  R"sql(
+CREATE TABLE zano.grams(key text PRIMARY KEY, common bytea NOT NULL);
+UPDATE zano.state SET value=-1 WHERE name='anchored';
 )sql"};
 
 /* Any number that all programs of this kind use to take turns. */
@@ -153,7 +159,8 @@ std::int64_t versionOf(Connection &connection) {
     if (tables == 0) {
         return 0;
     }
-    return connection.integer(newSql("SELECT value FROM zano.state WHERE name='schema'"), -1);
+    return connection.integer(newSql("SELECT value FROM zano.state WHERE name='schema'"),
+                              Connection::Plan::ForValues, -1);
 }
 
 void requireVersion(std::int64_t version) {

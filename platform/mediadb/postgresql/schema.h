@@ -11,7 +11,7 @@
 
 namespace zano::mediadb::postgresql {
 
-constexpr std::int64_t kSchemaVersion = 1;
+constexpr std::int64_t kSchemaVersion = 2;
 
 /* Several programs write at once, perhaps the same songs and always the same counts. So that they
  * never wait for each other in a circle, a batch is written in one go, under a lock on this row,

@@ -122,7 +122,8 @@ class PostgresqlReplacement : public Replacement {
 
     /* Not TRUNCATE, for which readers would have to wait. */
     void clear() override {
-        for (const std::string table : {"anchors", "facets", "songs", "playlists", "notices"}) {
+        for (const std::string table :
+             {"anchors", "grams", "facets", "songs", "playlists", "notices"}) {
             connection_.run("DELETE FROM " + table);
         }
     }

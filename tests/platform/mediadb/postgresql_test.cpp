@@ -111,6 +111,16 @@ TEST_F(PostgresqlTest, ALostConnectionIsAnErrorAndTheNextQueryHasAnother) {
     EXPECT_EQ(rows(nullptr, "path").size(), 1200U);
 }
 
+/* What all paths begin with is left out of a statement. */
+TEST_F(PostgresqlTest, AStatementForFormerSongsIsNotAnswered) {
+    index(location(), "/music/", 10);
+    const auto songsOfMusic = [this] { return rows("path like '/music/%'", "path", {0, 50}); };
+    EXPECT_EQ(songsOfMusic().size(), 10U);
+    index(location(), "/other/", 5);
+    EXPECT_EQ(songsOfMusic().size(), 10U);
+    EXPECT_EQ(MediaInfoDBGetCount(MEDIA_TABLE_SONGS, "*", "path like '/music/%'", 0, 0), 10);
+}
+
 /* The grants that the documentation names, and no more. */
 TEST_F(PostgresqlTest, AReaderNeedsNoRightButToRead) {
     index(location(), "/music/", 10);
@@ -122,6 +132,10 @@ TEST_F(PostgresqlTest, AReaderNeedsNoRightButToRead) {
     setSetting(Cluster::get().address(database, "music_reader"));
     EXPECT_EQ(rows("title ilike '%T%'", "lower(title)").size(), 10U);
     EXPECT_EQ(rows("lower(title)='t1'", "path").size(), 1U);
+    // As a role is whose rights are older than the table.
+    Cluster::run(location(), "REVOKE SELECT ON zano.grams FROM music_reader");
+    index(location(), "/music/a", 1);
+    EXPECT_EQ(rows("title ilike '%nowhere%' or title ilike '%T%'", "path", {0, 20}).size(), 11U);
     EXPECT_EQ(MediaInfoDBDelete(MEDIA_TABLE_PLAYLISTS, "/music/x.m3u"), -1);
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_OPEN) << KLIBCErrTextGet();
     setSetting(location());
