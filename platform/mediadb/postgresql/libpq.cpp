@@ -63,7 +63,6 @@ Libpq load() {
     find(library, "PQntuples", made.ntuples);
     find(library, "PQputCopyData", made.putCopyData);
     find(library, "PQputCopyEnd", made.putCopyEnd);
-    find(library, "PQgetResult", made.getResult);
     return made;
 }
 

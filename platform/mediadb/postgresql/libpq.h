@@ -38,7 +38,6 @@ struct Libpq {
     decltype(&::PQntuples) ntuples;
     decltype(&::PQputCopyData) putCopyData;
     decltype(&::PQputCopyEnd) putCopyEnd;
-    decltype(&::PQgetResult) getResult;
 };
 
 /* Throws DatabaseError when the library is not there. It stays until the program ends. */

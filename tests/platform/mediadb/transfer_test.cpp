@@ -299,6 +299,21 @@ TEST_P(TransferTest, MigrationFinishesAFirstScanAndMakesNothing) {
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_VERSION) << KLIBCErrTextGet();
 }
 
+TEST(PostgresqlTransferTest, AnOlderSchemaIsBroughtUpToDate) {
+    const std::string place = Cluster::get().newDatabase();
+    fillWithOddities(place);
+    Cluster::run(place, "DROP TABLE zano.grams; UPDATE zano.state SET value=1 WHERE name='schema'");
+    EXPECT_EQ(MediaInfoDBCheck(place.c_str(), nullptr), -1);
+    EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_DATABASE_VERSION) << KLIBCErrTextGet();
+    MEDIA_DB_MIGRATED migrated{};
+    ASSERT_EQ(MediaInfoDBMigrate(place.c_str(), &migrated, nullptr, nullptr), 0)
+        << KLIBCErrTextGet();
+    EXPECT_EQ(migrated.before, 1);
+    EXPECT_EQ(migrated.after, 2);
+    EXPECT_EQ(Cluster::run(place, "SELECT count(*) FROM zano.grams"), "4");
+    EXPECT_EQ(MediaInfoDBCheck(place.c_str(), nullptr), 0) << KLIBCErrTextGet();
+}
+
 /* The grants that the documentation names. */
 TEST(PostgresqlTransferTest, AReaderMayCheckAndCopyFrom) {
     const files::Folder folder;
