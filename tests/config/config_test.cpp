@@ -39,12 +39,11 @@ std::string split(const std::string &line) {
 
 class Configuration : public stand_in::Test {
   protected:
-    Configuration() {
-        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
-        fs::create_directories(ZANO_PATH_AUDIO_FOLDER);
-    }
-    ~Configuration() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
+    Configuration() { fs::create_directory(ZANO_PATH_AUDIO_FOLDER); }
     static void write(const std::string &text) { files::write(kPath, text); }
+
+  private:
+    const files::Places places_{ZANO_PATH_AUDIO_FOLDER};
 };
 
 TEST(ConfigurationLine, IsTakenApart) {

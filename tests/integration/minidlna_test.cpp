@@ -65,19 +65,6 @@ class MiniDlnaTest : public testing::Test {
     const MiniDlna server_{VORELIX_MUSIC};
 };
 
-/* As they are tagged. */
-const std::set<std::string> kTitles = {"She Said \"Hello\" & It's Fine",
-                                       "<img src=x onerror=alert(1)>",
-                                       "Rock & Roll & <b>Bold</b>",
-                                       "'; DROP TABLE songs; --",
-                                       "C:\\Music\\New Folder\\",
-                                       "Crème Brûlée",
-                                       "Straße nach Süden",
-                                       "ΣΊΣΥΦΟΣ",
-                                       "Ёлки и звёзды",
-                                       "春の歌",
-                                       "ドライブ"};
-
 TEST_F(MiniDlnaTest, AnswersTheCommands) {
     const std::string url = server_.url("/rootDesc.xml");
     // The network may lose a question or its answer.
@@ -111,7 +98,10 @@ TEST_F(MiniDlnaTest, AnswersTheCommands) {
     }
     EXPECT_EQ(ids.size(), static_cast<size_t>(music_.files));
     EXPECT_EQ(bytes, music_.bytes) << "each file once";
-    for (const std::string &title : kTitles) {
+    for (const char *title :
+         {"She Said \"Hello\" & It's Fine", "<img src=x onerror=alert(1)>",
+          "Rock & Roll & <b>Bold</b>", "'; DROP TABLE songs; --", "C:\\Music\\New Folder\\",
+          "Crème Brûlée", "Straße nach Süden", "ΣΊΣΥΦΟΣ", "Ёлки и звёзды", "春の歌", "ドライブ"}) {
         EXPECT_EQ(titles.count(title), 1U) << title;
     }
     const std::string count = std::to_string(music_.files);

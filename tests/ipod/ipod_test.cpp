@@ -75,12 +75,13 @@ std::string got(int index) {
 class IPod : public stand_in::Test {
   protected:
     IPod() {
-        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
         fs::create_directories(kFolder);
         EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
     }
-    ~IPod() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
     static void write(const std::string &tracks) { files::write(kTracks, tracks); }
+
+  private:
+    const files::Places places_{ZANO_PATH_AUDIO_FOLDER};
 };
 
 TEST_F(IPod, TracksAreReadByTheThreeReaders) {

@@ -17,11 +17,10 @@ const std::string kPath = ZANO_PATH_CUSTOM_KEYS;
 
 class CustomKeys : public stand_in::Test {
   protected:
-    CustomKeys() {
-        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
-        fs::create_directories(ZANO_PATH_AUDIO_FOLDER);
-    }
-    ~CustomKeys() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
+    CustomKeys() { fs::create_directory(ZANO_PATH_AUDIO_FOLDER); }
+
+  private:
+    const files::Places places_{ZANO_PATH_AUDIO_FOLDER};
 };
 
 /* "type|value|title", or "-1". */

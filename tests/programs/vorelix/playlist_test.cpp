@@ -23,8 +23,6 @@ class Playlists : public CommandLine {
   protected:
     Playlists() : music_(folder_ / "music"), folderOfShared_(music_ / "playlists") {
         fs::create_directories(music_);
-        fs::create_directories(fs::path(ZANO_PATH_MUSIC_LINK).parent_path());
-        fs::remove(ZANO_PATH_MUSIC_LINK);
         fs::create_directory_symlink(music_, ZANO_PATH_MUSIC_LINK);
         std::vector<zano::mediadb::Song> songs;
         for (char letter = 'a'; letter <= 'j'; ++letter) {
@@ -35,7 +33,6 @@ class Playlists : public CommandLine {
         }
         fill(songs);
     }
-    ~Playlists() override { fs::remove(ZANO_PATH_MUSIC_LINK); }
 
     /* What is printed on standard output; the command has to succeed. */
     static std::string says(Words arguments, const std::string &input = "") {
@@ -79,6 +76,7 @@ class Playlists : public CommandLine {
 
     std::ptrdiff_t filesOfShared() const { return files::countIn(folderOfShared_); }
 
+    const files::Places places_{ZANO_PATH_MUSIC_LINK};
     fs::path music_;
     fs::path folderOfShared_;
 };

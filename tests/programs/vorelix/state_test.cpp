@@ -28,11 +28,7 @@ constexpr const char *kDefaults =
 
 class State : public CommandLine {
   protected:
-    State() : queue_(folder_ / "q.queue") {
-        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
-        fs::create_directories(ZANO_PATH_IPOD_FOLDER);
-    }
-    ~State() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
+    State() : queue_(folder_ / "q.queue") { fs::create_directories(ZANO_PATH_IPOD_FOLDER); }
 
     static std::string says(const Words &words) {
         const Ended ended = run({words});
@@ -79,7 +75,8 @@ class State : public CommandLine {
         return titles;
     }
 
-    std::string queue_;
+    const files::Places places_{ZANO_PATH_AUDIO_FOLDER};
+    const std::string queue_;
 };
 
 TEST_F(State, SettingsAreMadeSetAndShown) {

@@ -1,5 +1,3 @@
-#include <fstream>
-
 #include "index_test.h"
 #include "mediadb/sqlite/engine.h"
 #include "system_paths_internal.h"
@@ -44,8 +42,8 @@ TEST_F(DeleteTest, RemovesTheRowsOfAFile) {
 }
 
 TEST_F(DeleteTest, AsTheLibraryStartsIt) {
-    fs::create_directories(fs::path(ZANO_PATH_CONF).parent_path());
-    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"" << location() << "\"\n";
+    const files::Places places{ZANO_PATH_CONF};
+    files::write(ZANO_PATH_CONF, "mediadb=\"" + location() + "\"\n");
     for (const auto &path : {music() + "/a/1.mp3", list_, std::string("/nowhere")}) {
         const auto ended = Process({ZANOINDEX_PROGRAM, {"-d", path}}).wait();
         EXPECT_EQ(ended.status, 0) << path;
@@ -54,11 +52,10 @@ TEST_F(DeleteTest, AsTheLibraryStartsIt) {
     EXPECT_EQ(paths(), (Lines{"a/2.mp3", "a/3.mp3"}));
     EXPECT_EQ(playlists(), 0U);
 
-    std::ofstream(ZANO_PATH_CONF) << "mediadb=\"sqlite:" << music() << "\"\n";
+    files::write(ZANO_PATH_CONF, "mediadb=\"sqlite:" + music() + "\"\n");
     const auto ended = Process({ZANOINDEX_PROGRAM, {"-d", "/nowhere"}}).wait();
     EXPECT_EQ(ended.status, 1) << "a failure is told";
     EXPECT_NE(ended.err.find(music()), std::string::npos) << ended.err;
-    fs::remove(ZANO_PATH_CONF);
 }
 
 }  // namespace

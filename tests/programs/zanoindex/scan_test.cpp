@@ -293,20 +293,10 @@ TEST_F(ScanTest, Notices) {
 }
 
 TEST_F(ScanTest, Usage) {
-    const std::vector<Lines> wrong = {
-        {},
-        {"--unknown", "x"},
-        {"-j", "0", "x"},
-        {"-j", "many", "x"},
-        {"--watch"},
-        {""},
-        {"-d"},
-        {"-d", ""},
-        {"-d", "x", "y"},
-        {"-d", "x", "--notices"},
-        {"--database"},
-    };
-    for (const auto &arguments : wrong) {
+    for (const Lines &arguments :
+         {Lines{}, Lines{"--unknown", "x"}, Lines{"-j", "0", "x"}, Lines{"-j", "many", "x"},
+          Lines{"--watch"}, Lines{""}, Lines{"-d"}, Lines{"-d", ""}, Lines{"-d", "x", "y"},
+          Lines{"-d", "x", "--notices"}, Lines{"--database"}}) {
         const auto ended = run(arguments);
         EXPECT_EQ(ended.status, 2) << testing::PrintToString(arguments);
         EXPECT_EQ(ended.out, "");

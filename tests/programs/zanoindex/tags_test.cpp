@@ -12,9 +12,7 @@ namespace {
 using TagsTest = IndexTest;
 
 /* Ten bytes, to be replaced by ten others in a file. */
-constexpr std::string_view kTitle =
-    "S\xC3\xB8"
-    "dm\xC3\xA9 \xE6\x9B\xB2";
+constexpr std::string_view kTitle = "S\u00F8dm\u00E9 \u66F2";
 static_assert(kTitle.size() == 11);
 
 /* Of all samples, in order. */

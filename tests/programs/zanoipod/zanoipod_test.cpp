@@ -23,12 +23,10 @@ const std::string kTracks = kFolder + "tracks.m3u";
 class ZanoIPod : public testing::Test {
   protected:
     ZanoIPod() : ipod_(folder_.path("iPod")) {
-        fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
         EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
         fs::create_directory(ipod_);
         files::write(folder_.path("song.mp3"), "not read by anybody");
     }
-    ~ZanoIPod() override { fs::remove_all(ZANO_PATH_AUDIO_FOLDER); }
 
     /* Makes an iPod with what fill() puts into its database. */
     void make(const std::function<void(Itdb_iTunesDB &)> &fill) const {
@@ -95,6 +93,7 @@ class ZanoIPod : public testing::Test {
         return titles;
     }
 
+    const files::Places places_{ZANO_PATH_AUDIO_FOLDER};
     files::Folder folder_;
     std::string ipod_;
     std::string printed_;
