@@ -66,9 +66,9 @@ TEST_F(Listing, TextsThatReachTheDatabase) {
         {"abcdefghijklmnopqrstuvwxyz1", " abcdefghijklmnopqrstuvwxyz1 des" + tail},
         {"abcdefghijklmnopqrstuvwxyz123456", " abcdefghijklmnopqrstuvwxyz12345" + tail},
     };
-    for (const auto &[column, order] : orders) {
-        expectOpen("null", '"' + order + '"', [&](ZANO_PLAYLIST_REC **list) {
-            return ZANOMusicListAll(list, 0, nullptr, column.c_str(), 0, 100, 50);
+    for (const auto &each : orders) {
+        expectOpen("null", '"' + each.second + '"', [&](ZANO_PLAYLIST_REC **list) {
+            return ZANOMusicListAll(list, 0, nullptr, each.first.c_str(), 0, 100, 50);
         });
     }
 }
