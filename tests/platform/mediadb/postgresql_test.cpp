@@ -114,7 +114,7 @@ TEST_F(PostgresqlTest, ALostConnectionIsAnErrorAndTheNextQueryHasAnother) {
 /* What all paths begin with is left out of a statement. */
 TEST_F(PostgresqlTest, AStatementForFormerSongsIsNotAnswered) {
     index(location(), "/music/", 10);
-    const auto songsOfMusic = [this] { return rows("path like '/music/%'", "path", {0, 50}); };
+    const auto songsOfMusic = [] { return rows("path like '/music/%'", "path", {0, 50}); };
     EXPECT_EQ(songsOfMusic().size(), 10U);
     index(location(), "/other/", 5);
     EXPECT_EQ(songsOfMusic().size(), 10U);
