@@ -17,6 +17,7 @@
 #include "plan.h"
 #include "ranks.h"
 #include "schema.h"
+#include "short_counts.h"
 #include "text/fold.h"
 
 namespace zano::mediadb::sqlite {
@@ -123,6 +124,7 @@ class SqliteCatalogue : public Catalogue {
         isChanged_ = false;
         pending_.clear();
         gramsToDrop_.clear();
+        shortCounts_.clear();
         facetCounts_.clear();
     }
 
@@ -336,7 +338,8 @@ class SqliteCatalogue : public Catalogue {
             return;
         }
         if (song.isRanked) {
-            gramsToDrop_.emplace(song.rank, song.document());
+            const auto place = gramsToDrop_.emplace(song.rank, song.document()).first;
+            shortCounts_.add(place->second, -1);
         }
         const std::pair<const std::string &, const std::string &> values[] = {
             {song.artist, song.artistKey},
@@ -383,6 +386,7 @@ class SqliteCatalogue : public Catalogue {
         dropOrdersOf(connection_);
         pending_.clear();
         gramsToDrop_.clear();
+        shortCounts_.clear();
         facetCounts_.clear();
     }
 
@@ -406,8 +410,9 @@ class SqliteCatalogue : public Catalogue {
                        gramDocument(key.titleKey, key.artistKey, key.albumKey, key.genreKey);
         };
         for (const std::int64_t id : pending_) {
-            add(id);
+            shortCounts_.add(add(id), 1);
         }
+        shortCounts_.write(connection_);
         for (const auto &[id, formerRank] : moved) {
             gramsToDrop_.emplace(formerRank, add(id));
         }
@@ -465,7 +470,9 @@ class SqliteCatalogue : public Catalogue {
             const std::string document =
                 gramDocument(rows.text(1), rows.text(2), rows.text(3), rows.text(4));
             addGrams_.bind(1, rows.integer(0)).bind(2, std::string_view(document)).run();
+            shortCounts_.add(document, 1);
         }
+        shortCounts_.write(connection_);
     }
 
     void buildFacets() {
@@ -532,6 +539,7 @@ class SqliteCatalogue : public Catalogue {
     std::int64_t songs_ = 0;
     std::set<std::int64_t> pending_;
     std::map<std::int64_t, std::string> gramsToDrop_;  // by rank
+    ShortCounts shortCounts_;
     std::map<std::string, std::int64_t> facetCounts_;
 
     Statement find_, insert_, replace_, touch_, remove_;

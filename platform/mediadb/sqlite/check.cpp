@@ -10,6 +10,7 @@
 #include "plan.h"
 #include "ranks.h"
 #include "schema.h"
+#include "short_counts.h"
 #include "text/fold.h"
 
 namespace zano::mediadb::sqlite {
@@ -169,6 +170,9 @@ void checkDatabase(Connection &connection) {
     checkOrder(connection, titleOrder());
     checkFacets(connection);
     checkGrams(connection);
+    if (!countShort(connection).areIn(connection)) {
+        damaged("its counts of one and two characters are not those of the songs");
+    }
     if (state(connection, "anchored") == state(connection, "generation")) {
         checkAnchors(connection);
     }

@@ -35,7 +35,7 @@ char signOf(Column column) {
 }
 
 bool isSign(char c) {
-    return c >= kSigns.front().sign && c <= kSigns.back().sign;
+    return isColumnSign(static_cast<unsigned char>(c));
 }
 
 /* The number of bytes of the character that begins here; keys are valid UTF-8. */
@@ -170,6 +170,11 @@ std::string matchOf(const TermTokens &term) {
 }
 
 }  // namespace
+
+bool isColumnSign(char32_t character) {
+    return character >= static_cast<unsigned char>(kSigns.front().sign) &&
+           character <= static_cast<unsigned char>(kSigns.back().sign);
+}
 
 void addGramTokenizer(sqlite3 *connection) {
     fts5_api *api = nullptr;

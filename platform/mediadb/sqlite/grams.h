@@ -22,6 +22,10 @@ namespace zano::mediadb::sqlite {
 /* The tokenizer's name in the schema: it is on disk, and so is what it makes of a document. */
 constexpr std::string_view kGramTokenizer = "zanograms";
 
+/* A document holds the keys of a song, each behind the sign of its column, padded at its end. */
+bool isColumnSign(char32_t character);
+constexpr char32_t kGramPadding = U'\x1F';
+
 /* Makes the tokenizer known to a connection, which needs it to read or write the index. */
 void addGramTokenizer(sqlite3 *connection);
 

@@ -326,6 +326,10 @@ std::int64_t SongPlan::count(std::optional<Column> distinct) {
         }
     }
     if (grams_ && grams_->isExact && !distinct) {
+        if (grams_->isShort && terms_.size() == 1) {
+            Sql kept = newSql("SELECT songs FROM short_counts WHERE gram=");
+            return reader_.integer(kept.bind(gramsOf(terms_[0])[0]));
+        }
         Sql sql = newSql("SELECT count(*) FROM grams WHERE ");
         addMatch(sql);
         return reader_.integer(sql);

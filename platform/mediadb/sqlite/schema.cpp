@@ -10,6 +10,7 @@
 
 #include "../catalogue.h"
 #include "grams.h"
+#include "short_counts.h"
 #include "text/fold.h"
 
 namespace zano::mediadb::sqlite {
@@ -55,13 +56,16 @@ INSERT INTO state VALUES('songs', 0), ('generation', 0), ('anchored', -1), ('ord
     ('artists', 0), ('albums', 0), ('genres', 0);
 CREATE VIRTUAL TABLE grams USING fts5(
     document, content='', detail=none, columnsize=0, tokenize='zanograms');
+)sql",
+                                                                  R"sql(
+CREATE TABLE short_counts(gram TEXT PRIMARY KEY, songs INTEGER NOT NULL) WITHOUT ROWID;
 )sql"};
 
 /* What a SELECT of ours reads, FTS5's own tables included. */
-constexpr std::array<std::string_view, 13> kReadableTables = {
-    "songs",     "playlists",     "facets",       "anchors",   "gram_counts",
-    "state",     "grams",         "grams_data",   "grams_idx", "grams_config",
-    "json_each", "sqlite_master", "grams_docsize"};
+constexpr std::array<std::string_view, 14> kReadableTables = {
+    "songs",     "playlists",     "facets",        "anchors",     "gram_counts",
+    "state",     "grams",         "grams_data",    "grams_idx",   "grams_config",
+    "json_each", "sqlite_master", "grams_docsize", "short_counts"};
 constexpr std::array<std::string_view, 16> kCallableFunctions = {
     "random", "instr", "zano_like", "zano_fold", "zano_lower", "length",    "count", "min",
     "max",    "-",     "match",     "fts5",      "json_each",  "json_type", "abs",   "total"};
@@ -183,9 +187,13 @@ void migrate(Connection &connection, const std::string &path) {
         if (!isEmptyFile(connection)) {
             checkVersion(connection, path);
         }
-        for (auto version = connection.integer("PRAGMA user_version"); version < kSchemaVersion;
-             ++version) {
+        const auto before = connection.integer("PRAGMA user_version");
+        for (auto version = before; version < kSchemaVersion; ++version) {
             connection.run(kMigrations[static_cast<size_t>(version)]);
+        }
+        if (before == 1 &&
+            connection.integer("SELECT value FROM state WHERE name='ordered'") != 0) {
+            countShort(connection).write(connection);
         }
         connection.run("PRAGMA application_id=" + std::to_string(kApplicationId));
         connection.run("PRAGMA user_version=" + std::to_string(kSchemaVersion));
@@ -367,8 +375,7 @@ void dropOrdersOf(Connection &connection) {
         }
     }
     connection.run("INSERT INTO grams(grams) VALUES('delete-all')");
-    connection.run("DELETE FROM facets");
-    connection.run("DELETE FROM anchors");
+    connection.run("DELETE FROM short_counts; DELETE FROM facets; DELETE FROM anchors");
 }
 
 std::vector<std::string> createIndexes() {

@@ -17,7 +17,7 @@ namespace zano::mediadb::sqlite {
 
 /* Written into the file, so that a file of another program is told apart: "Zmdb". */
 constexpr int kApplicationId = 0x5A6D6462;
-constexpr int kSchemaVersion = 1;
+constexpr int kSchemaVersion = 2;
 
 /* Opens for writing. A missing file and its folders are made, an older schema is migrated; a file
  * that is not a media database, or is from a newer version, is left as it is and throws. */
