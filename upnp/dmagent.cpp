@@ -1,6 +1,7 @@
 #include <vorelix/upnp/dmagent.h>
 
 #include <array>
+#include <atomic>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
@@ -67,7 +68,11 @@ char *grown(char *buffer, std::size_t size) {
 std::size_t receive(char *data, std::size_t size, std::size_t count, void *target) {
     auto &agent = *static_cast<DMAgent *>(target);
     const std::size_t length = size * count;
-    agent.response = grown(agent.response, agent.responseSize + length + 1);
+    // A handler of signals that looks at the answer meanwhile must not see a buffer that is given
+    // back.
+    char *const former = std::exchange(agent.response, nullptr);
+    std::atomic_signal_fence(std::memory_order_seq_cst);
+    agent.response = grown(former, agent.responseSize + length + 1);
     if (agent.response != nullptr) {
         std::memcpy(agent.response + agent.responseSize, data, length);
         agent.responseSize += static_cast<unsigned int>(length);

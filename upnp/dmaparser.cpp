@@ -40,22 +40,30 @@ bool isNamed(const xmlNode &node, std::string_view name) {
 }
 
 /* What may still be taken through entities: a few lines of them, each of which names another ten
- * times, would grow beyond memory and time. Once something is too much, nothing is left. */
+ * times, would grow beyond memory and time. Looking for the end of a text is bounded too. */
 class Allowance {
   public:
-    explicit Allowance(std::size_t bytes) : left_(bytes) {}
+    explicit Allowance(std::size_t bytes) : left_(bytes), looks_(kLooks * bytes) {}
 
     bool spend(std::size_t bytes) {
-        const bool enough = bytes <= left_;
-        left_ = enough ? left_ - bytes : 0;
-        return enough;
+        const bool isEnough = bytes <= left_;
+        left_ -= isEnough ? bytes : 0;
+        return isEnough;
     }
 
     /* The text itself, or "" when it is too long. */
-    const char *spendOn(const char *text) { return spend(strnlen(text, left_ + 1)) ? text : ""; }
+    const char *spendOn(const char *text) {
+        const std::size_t size = strnlen(text, std::min(left_ + 1, looks_));
+        const bool isSeen = size < looks_;
+        looks_ -= size;
+        return isSeen && spend(size) ? text : "";
+    }
 
   private:
+    static constexpr std::size_t kLooks = 16;
+
     std::size_t left_;
+    std::size_t looks_;
 };
 
 /* As strtol gives it where a long has 32 bits. */
@@ -65,8 +73,8 @@ int numberOf(const char *text) {
         std::clamp<long>(number, std::numeric_limits<int>::min(), std::numeric_limits<int>::max()));
 }
 
-/* libxml2 copies the namespaces of every element, also those that a document type fills in: one of
- * them may be longer than all the rest of the text, and none is wanted here. */
+/* Reads a text as xmlReadMemory does, but for what would grow beyond it: namespaces that a document
+ * type gives to elements, which libxml2 copies for each, and parameter entities. */
 class DocumentReader {
   public:
     DocumentReader(const char *buffer, int length)
@@ -74,14 +82,15 @@ class DocumentReader {
           length_(length),
           allowance_(kBytesInUtf8 * static_cast<std::size_t>(std::max(length, 0))) {}
 
-    /* As xmlReadMemory does it. */
     std::unique_ptr<xmlDoc, FreeDocument> read() {
-        const std::unique_ptr<xmlParserCtxt, FreeContext> context(xmlNewParserCtxt());
+        const std::unique_ptr<xmlParserCtxt, FreeContext> context(length_ > 0 ? xmlNewParserCtxt()
+                                                                              : nullptr);
         if (context == nullptr) {
             return nullptr;
         }
         context->_private = this;
         startElement_ = std::exchange(context->sax->startElementNs, start);
+        parameterEntity_ = std::exchange(context->sax->getParameterEntity, parameterEntity);
         return std::unique_ptr<xmlDoc, FreeDocument>(
             xmlCtxtReadMemory(context.get(), buffer_, length_, "noname.xml", nullptr, 0));
     }
@@ -91,25 +100,49 @@ class DocumentReader {
         void operator()(xmlParserCtxt *context) const { xmlFreeParserCtxt(context); }
     };
 
-    static constexpr std::size_t kBytesInUtf8 = 2;  // at most, of each byte of a text
+    static constexpr std::size_t kBytesInUtf8 = 3;  // at most, of each byte of a text
+    static constexpr std::size_t kShortestReference = std::string_view("%p;").size();
+    static constexpr std::size_t kShortestNamespace = std::string_view("xmlns=''").size();
+
+    static DocumentReader &of(void *context) {
+        return *static_cast<DocumentReader *>(static_cast<xmlParserCtxt *>(context)->_private);
+    }
 
     static void start(void *context, const xmlChar *name, const xmlChar *prefix, const xmlChar *uri,
                       int namespaceCount, const xmlChar **namespaces, int attributeCount,
                       int defaultedCount, const xmlChar **attributes) {
-        auto &reader =
-            *static_cast<DocumentReader *>(static_cast<xmlParserCtxt *>(context)->_private);
-        bool isEnough = true;
-        for (int i = 0; i < namespaceCount; ++i) {
-            isEnough = reader.allowance_.spend(std::strlen(textOf(namespaces[2 * i + 1])));
+        DocumentReader &reader = of(context);
+        std::size_t bytes = kShortestNamespace * static_cast<std::size_t>(namespaceCount);
+        for (int i = 0; i < 2 * namespaceCount; ++i) {
+            bytes += std::strlen(textOf(namespaces[i]));
         }
-        reader.startElement_(context, name, prefix, uri, isEnough ? namespaceCount : 0, namespaces,
+        reader.startElement_(context, name, prefix, uri,
+                             reader.allowance_.spend(bytes) ? namespaceCount : 0, namespaces,
                              attributeCount, defaultedCount, attributes);
+    }
+
+    static xmlEntity *parameterEntity(void *context, const xmlChar *name) {
+        DocumentReader &reader = of(context);
+        xmlEntity *const entity = reader.parameterEntity_(context, name);
+        const auto length = static_cast<std::size_t>(entity != nullptr ? entity->length : 0);
+        return reader.allowance_.spend(kShortestReference + length) ? entity : nullptr;
     }
 
     const char *buffer_;
     int length_;
     Allowance allowance_;
     startElementNsSAX2Func startElement_ = nullptr;
+    getParameterEntitySAXFunc parameterEntity_ = nullptr;
+};
+
+/* A node that is not on a list yet, with the resources on its own list. */
+struct DeleteTree {
+    void operator()(ItemNode *node) const {
+        if (node->children != nullptr) {
+            std::for_each(node->children->begin(), node->children->end(), *this);
+        }
+        delete node;
+    }
 };
 
 /* Fills the lists of a parser from a tree. A reference to an entity is a node whose children are
@@ -117,7 +150,8 @@ class DocumentReader {
  * stands what the entity holds. */
 class Walk {
   public:
-    Walk(DMAParser &parser, std::size_t allowance) : parser_(parser), allowance_(allowance) {}
+    Walk(DMAParser &parser, std::size_t allowance)
+        : parser_(parser), steps_(allowance), bytes_(allowance) {}
 
     /* Of a node, its following siblings and all that is below them. On a stack of its own, for
      * entities may lead round in a circle until the allowance is spent. */
@@ -126,7 +160,7 @@ class Walk {
         while (!places.empty()) {
             const Place place = places.back();
             places.pop_back();
-            if (place.node == nullptr || (place.inEntity && !allowance_.spend(kShortestItem))) {
+            if (place.node == nullptr || (place.inEntity && !steps_.spend(1))) {
                 continue;
             }
             places.push_back({place.node->next, place.inEntity});
@@ -138,7 +172,10 @@ class Walk {
     }
 
     void item(ItemList &list, const xmlNode &element, bool inEntity) {
-        auto node = std::make_unique<ItemNode>();
+        if (inEntity && !bytes_.spend(kShortestItem)) {
+            return;
+        }
+        std::unique_ptr<ItemNode, DeleteTree> node(new ItemNode);
         if (isNamed(element, "res") && element.children != nullptr) {
             add(*node, "res", element.children, inEntity);
         }
@@ -189,7 +226,7 @@ class Walk {
             if (child->type != XML_ELEMENT_NODE) {
                 continue;
             }
-            if (inEntity && !allowance_.spend(kShortestItem)) {
+            if (inEntity && !steps_.spend(1)) {
                 return;
             }
             if (!isNamed(*child, "res")) {
@@ -204,7 +241,7 @@ class Walk {
     }
 
     void add(ItemNode &node, const char *name, const xmlNode *child, bool inEntity) {
-        if (!inEntity || allowance_.spend(std::strlen(name))) {
+        if (!inEntity || bytes_.spend(std::strlen(name))) {
             node.try_emplace(name, contentOf(child, inEntity));
         }
     }
@@ -215,15 +252,15 @@ class Walk {
             return "";
         }
         if (child->type == XML_ENTITY_DECL) {
-            return allowance_.spendOn(textOf(reinterpret_cast<const xmlEntity *>(child)->content));
+            return bytes_.spendOn(textOf(reinterpret_cast<const xmlEntity *>(child)->content));
         }
         const char *const content = textOf(child->content);
         const bool isReference = child->type == XML_ENTITY_REF_NODE;
-        return inEntity || isReference ? allowance_.spendOn(content) : content;
+        return inEntity || isReference ? bytes_.spendOn(content) : content;
     }
 
     DMAParser &parser_;
-    Allowance allowance_;
+    Allowance steps_, bytes_;
 };
 
 /* For a tree of which nobody says how long its text was. */

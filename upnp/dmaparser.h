@@ -46,8 +46,8 @@ class VORELIX_API ItemList : public std::list<ItemNode *> {
  * element's attributes ("id", "parentID", "childCount"), then its child elements but `res`
  * ("title", "creator", "class"), whose own attributes are left out. The first value of a key
  * stays. The value is what stands first in the element, its text as a rule, or what an entity
- * declared by the document holds; "" when that is nothing or an element. A resource has its address under "res" and its attributes
- * ("protocolInfo", "size", "duration"). */
+ * declared by the document holds; "" when that is nothing or an element. A resource has its address
+ * under "res" and its attributes ("protocolInfo", "size", "duration"). */
 class VORELIX_API ItemNode : public std::map<std::string, std::string> {
   public:
     ItemNode();
@@ -86,8 +86,8 @@ class VORELIX_API DMAParser {
      * document, which libxml2 explains on standard error, or when memory runs out: the lists have
      * then what was added so far. Nodes are known by their names, processing instructions and
      * declarations too. Entities that a document declares are looked into as long as they add no
-     * more than `length` bytes, and are empty from there on; nothing is fetched and no file is
-     * read. A null buffer gives -1. */
+     * more than `length` bytes, and what would go beyond is empty; nothing is fetched and no file
+     * is read. A null buffer gives -1. */
     int Parse(const char *buffer, int length);
 
     /* Reads the response of a request that was performed, which may not be null. */

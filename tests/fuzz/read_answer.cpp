@@ -57,7 +57,7 @@ void parse(DMABrowse &browse) {
     require(result == 0 || (parser.containers->empty() && parser.items->empty()));
     require(parser.numberReturned == 0);
     const std::size_t kept = consume(parser.containers) + consume(parser.items);
-    const std::size_t inUtf8 = std::strstr(browse.response, "encoding") == nullptr ? 1 : 2;
+    const std::size_t inUtf8 = std::strstr(browse.response, "encoding") == nullptr ? 1 : 3;
     require(kept <= 2 * inUtf8 * browse.responseSize);
 }
 
