@@ -13,10 +13,13 @@ std::string counted(std::int64_t count, const char *what) {
 
 void requireRoom(Replacement &target, bool replace) {
     const Contents former = target.contents();
-    if (!replace && former.songs + former.playlists > 0) {
+    if (!replace && former.songs + former.playlists + former.notices > 0) {
         throw DatabaseError(KLIB_ERR_DATABASE_FILLED,
                             "it holds " + counted(former.songs, "song") + " and " +
-                                counted(former.playlists, "playlist") + " already");
+                                counted(former.playlists, "playlist") + " already" +
+                                (former.notices > 0 ? ", and " + counted(former.notices, "notice") +
+                                                          " that zanoindex has to take"
+                                                    : ""));
     }
 }
 
@@ -35,14 +38,16 @@ class Copy {
                                     "it is the database to copy from, by another name perhaps");
             }
             requireRoom(*target_, replace);
-            target_->clear();
         });
         const Contents lastIds = at(from_, [&] {
             total_ = source_->contents();
+            return source_->lastIds();
+        });
+        at(to_, [&] { target_->clear(); });
+        at(from_, [&] {
             source_->forEachSong(adding<SongRow>(progress));
             source_->forEachPlaylist(adding<PlaylistRow>(progress));
             source_->forEachNotice(adding<Notice>(progress));
-            return source_->lastIds();
         });
         at(to_, [&] { target_->commit(lastIds); });
         return total_;

@@ -26,11 +26,12 @@ constexpr size_t kSongsAtOnce = 1000;
 constexpr size_t kSongsHeld = 20000;
 /* The planner's numbers are made anew when a fifth of the songs has come or gone. */
 constexpr std::int64_t kRecountShare = 5;
-/* So many songs tell which trigrams are common: those of more than a few songs, or of more than one
- * in a thousand. */
+/* So many songs tell which letters in a row are common, which are those of more than a few songs,
+ * or of more than one in a thousand, and which are frequent. */
 constexpr double kSongsSampled = 50000;
 constexpr std::int64_t kFewSongs = 200;
 constexpr std::int64_t kFewShare = 1000;
+constexpr std::int64_t kManyShare = 20;
 constexpr std::array kSearched = {Column::Title, Column::Artist, Column::Album, Column::Genre};
 /* Held by who sets anchors; any number that all programs of this kind use. */
 constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
@@ -410,11 +411,15 @@ class PostgresqlCatalogue : public Catalogue {
             }
         }
         connection_.run(std::string("CLOSE files; DELETE FROM grams"));
-        const auto few = static_cast<double>(std::max(kFewSongs, songs / kFewShare)) * share;
+        const auto sampled = [share](std::int64_t number) {
+            return static_cast<std::int64_t>(static_cast<double>(number) * share);
+        };
         for (size_t column = 0; column < keys.size(); ++column) {
+            const GramCounts &found = (*counts)[column];
             Sql sql = newSql("INSERT INTO grams VALUES(").bind(std::string(keys[column])).add(",");
-            connection_.run(
-                sql.bind((*counts)[column].commonOnes(static_cast<std::int64_t>(few))).add(")"));
+            sql.bind(found.moreThan(sampled(std::max(kFewSongs, songs / kFewShare))).bits());
+            sql.add(",").bind(found.moreThan(sampled(songs / kManyShare)).bits());
+            connection_.run(sql.add(")"));
         }
     }
 

@@ -1,33 +1,38 @@
 #include "common_grams.h"
 
-#include <optional>
-
 namespace zano::mediadb::postgresql {
 namespace {
 
 constexpr std::size_t kBits = 8;
+constexpr std::size_t kSymbols = 37;  // with 0 for none
+constexpr std::size_t kLongest = 3;
 
-std::optional<std::size_t> symbolOf(char character) {
+std::size_t symbolOf(char character) {
     if (character >= 'a' && character <= 'z') {
-        return static_cast<std::size_t>(character - 'a');
+        return static_cast<std::size_t>(character - 'a') + 1;
     }
     if (character >= '0' && character <= '9') {
-        return static_cast<std::size_t>(character - '0') + 26;
+        return static_cast<std::size_t>(character - '0') + 27;
     }
-    return std::nullopt;
+    return 0;
 }
 
-/* Calls back with the number of every trigram, until that returns true. */
+/* Calls back with the number and the length of everything in a text that has one, until that
+ * returns true. */
 template <typename Callback>
 bool anyGram(std::string_view text, const Callback &callback) {
-    std::size_t gram = 0;
-    std::size_t length = 0;
-    for (const char character : text) {
-        const auto symbol = symbolOf(character);
-        length = symbol ? length + 1 : 0;
-        gram = (gram * GramCounts::kSymbols + symbol.value_or(0)) % GramCounts::kGrams;
-        if (length >= 3 && callback(gram)) {
-            return true;
+    for (std::size_t begin = 0; begin < text.size(); ++begin) {
+        std::size_t number = 0;
+        for (std::size_t length = 1; length <= kLongest && begin + length <= text.size();
+             ++length) {
+            const std::size_t symbol = symbolOf(text[begin + length - 1]);
+            if (symbol == 0) {
+                break;
+            }
+            number = number * kSymbols + symbol;
+            if (callback(number, length)) {
+                return true;
+            }
         }
     }
     return false;
@@ -35,34 +40,52 @@ bool anyGram(std::string_view text, const Callback &callback) {
 
 }  // namespace
 
-bool hasGram(std::string_view text) {
-    return anyGram(text, [](std::size_t) { return true; });
+std::size_t gramNumber(std::string_view text) {
+    std::size_t found = 0;
+    anyGram(text, [&](std::size_t number, std::size_t length) {
+        found = length == text.size() ? number : 0;
+        return found != 0;
+    });
+    return found;
 }
 
-bool CommonGrams::hasRareIn(std::string_view text) const {
-    return bits_.size() * kBits >= GramCounts::kGrams && anyGram(text, [this](std::size_t gram) {
-               const auto byte = static_cast<unsigned char>(bits_[gram / kBits]);
-               return (byte >> (gram % kBits) & 1U) == 0;
-           });
+bool hasTrigram(std::string_view text) {
+    return anyGram(text, [](std::size_t, std::size_t length) { return length == kLongest; });
+}
+
+bool GramSet::has(std::size_t gram) const {
+    return gram / kBits < bits_.size() &&
+           (static_cast<unsigned char>(bits_[gram / kBits]) >> gram % kBits & 1U) != 0;
+}
+
+bool GramSet::hasEveryTrigramOf(std::string_view text) const {
+    return !anyGram(text, [this](std::size_t gram, std::size_t length) {
+        return length == kLongest && !has(gram);
+    });
+}
+
+void GramSet::add(std::size_t gram) {
+    bits_.resize((kGramNumbers + kBits - 1) / kBits);
+    bits_[gram / kBits] = static_cast<char>(bits_[gram / kBits] | 1 << gram % kBits);
 }
 
 void GramCounts::add(std::string_view key) {
     ++keys_;
-    anyGram(key, [this](std::size_t gram) {
+    anyGram(key, [this](std::size_t gram, std::size_t) {
         counts_[gram] += lastKey_[gram] != keys_ ? 1 : 0;
         lastKey_[gram] = keys_;
         return false;
     });
 }
 
-std::string GramCounts::commonOnes(std::int64_t keys) const {
-    std::string bits((kGrams + kBits - 1) / kBits, '\0');
-    for (std::size_t gram = 0; gram < kGrams; ++gram) {
+GramSet GramCounts::moreThan(std::int64_t keys) const {
+    GramSet grams;
+    for (std::size_t gram = 1; gram < kGramNumbers; ++gram) {
         if (counts_[gram] > keys) {
-            bits[gram / kBits] = static_cast<char>(bits[gram / kBits] | 1 << gram % kBits);
+            grams.add(gram);
         }
     }
-    return bits;
+    return grams;
 }
 
 }  // namespace zano::mediadb::postgresql

@@ -1,6 +1,10 @@
-/* Which trigrams are common, so that a search that can find only a few songs is known before it is
- * made: one plan, by the trigram index, serves all of those, and planning would take longer than
- * finding them. Stale knowledge costs time alone. */
+/* How many songs have which few letters in a row, as far as it is good to know before a search is
+ * made: where a search can find only a few songs, or nearly fills a page wherever it begins, one
+ * plan serves all searches of the kind, and making one for its words takes longer than the rest.
+ * Stale knowledge costs time alone.
+ *
+ * Only the letters a to z and digits count: what else belongs to a word depends on the locale of
+ * the server. */
 #pragma once
 
 #include <array>
@@ -11,35 +15,39 @@
 
 namespace zano::mediadb::postgresql {
 
-/* Only trigrams of the letters a to z and digits count: what else belongs to a word depends on the
- * locale of the server. */
-bool hasGram(std::string_view text);
+/* One to three of them in a row, in a number; 0 for any other text. */
+std::size_t gramNumber(std::string_view text);
+constexpr std::size_t kGramNumbers = 37 * 37 * 37;
 
-class CommonGrams {
+/* Whether there are three in a row somewhere. */
+bool hasTrigram(std::string_view text);
+
+/* A bit for each number. */
+class GramSet {
   public:
-    /* A bit for each trigram, as GramCounts writes them; "": all count as common. */
-    explicit CommonGrams(std::string bits) : bits_(std::move(bits)) {}
+    GramSet() = default;
+    explicit GramSet(std::string bits) : bits_(std::move(bits)) {}
 
-    /* Whether a text has a trigram that few songs have. */
-    bool hasRareIn(std::string_view text) const;
+    bool isKnown() const { return !bits_.empty(); }
+    bool has(std::size_t gram) const;
+    bool hasEveryTrigramOf(std::string_view text) const;
+    void add(std::size_t gram);
+    const std::string &bits() const { return bits_; }
 
   private:
     std::string bits_;
 };
 
-/* Counts the trigrams of some keys. */
+/* Counts some keys. */
 class GramCounts {
   public:
-    static constexpr std::size_t kSymbols = 36;
-    static constexpr std::size_t kGrams = kSymbols * kSymbols * kSymbols;
-
     void add(std::string_view key);
-    /* The bits of those that more than so many keys have. */
-    std::string commonOnes(std::int64_t keys) const;
+    /* What more than so many keys have. */
+    GramSet moreThan(std::int64_t keys) const;
 
   private:
-    std::array<std::uint32_t, kGrams> counts_{};
-    std::array<std::uint32_t, kGrams> lastKey_{};
+    std::array<std::uint32_t, kGramNumbers> counts_{};
+    std::array<std::uint32_t, kGramNumbers> lastKey_{};
     std::uint32_t keys_ = 0;
 };
 

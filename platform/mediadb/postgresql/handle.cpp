@@ -392,10 +392,8 @@ void Connection::send(const Prepared &statement, const std::vector<Value> &value
                                       parameters.formats(), 1) != 0);
 }
 
-/* A pipeline that is not sent as a whole leaves the connection waiting for the rest. */
 void Connection::require(bool isSent) {
     if (!isSent) {
-        isOutOfStep_ = true;
         checked(nullptr);
     }
 }
@@ -436,6 +434,7 @@ std::vector<Result> Connection::runTogether(std::initializer_list<std::string> f
     }
     const Prepared &last = prepare(sql.text());
     awaitIdle();
+    isOutOfStep_ = true;  // until all of it is sent and read, also when memory runs out meanwhile
     require(libpq().enterPipelineMode(connection_.get()) != 0);
     for (const Prepared *statement : statements) {
         send(*statement, {});

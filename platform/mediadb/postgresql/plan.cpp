@@ -53,10 +53,11 @@ void addLimit(Sql &sql, std::int64_t rows) {
 }
 
 /* One of the two stretches of a descending order from a place on, each of which an index gives in
- * order: what has the leading value of the place, and what lies behind that value. */
+ * order: what has the leading value of the place, and what lies behind that value. The server
+ * merges them as far as it must. */
 void addStretch(Sql &sql, const OrderTerm &leading, bool isSameValue, std::int64_t rows) {
     const std::string_view column = orderColumn(leading.column);
-    sql.add("(SELECT songs.*, ").add(isSameValue ? "0" : "1").add(" AS stretch FROM songs WHERE ");
+    sql.add("(SELECT * FROM songs WHERE ");
     addComparison(sql, {column}, isSameValue ? "=" : "<");
     if (isSameValue) {
         addComparison(sql.add(" AND "), tailColumns(leading.column), ">=");
@@ -106,21 +107,31 @@ void SongPlan::addSongs(Sql &sql) {
     }
 }
 
+/* A search whose results fill a page in a short walk along any order. */
+bool SongPlan::isFrequent() const {
+    return conjuncts_.size() == 1 &&
+           std::any_of(conjuncts_[0].searches.begin(), conjuncts_[0].searches.end(),
+                       [this](const SearchTerm &term) { return reader_.isFrequent(term); });
+}
+
 /* What an index gives from a known place on, whatever the values. */
 bool SongPlan::isPlanKept(const Query &query) const {
     const auto leading = leadingOf(query.order);
     const bool isInOrder = leading && findStoredOrder(*leading) != nullptr;
     const bool isShort = query.limit > 0 && query.limit <= kLongestAnchoredPage;
-    const bool isPlaceKnown =
-        query.offset == 0 || reader_.state().anchored == reader_.state().generation;
-    return conjuncts_.empty() && !query.random && !query.distinct && isInOrder && isShort &&
-           isPlaceKnown;
+    if (query.random || query.distinct || !isInOrder || !isShort) {
+        return false;
+    }
+    if (!conjuncts_.empty()) {
+        return query.offset <= kLongestAnchoredPage && isFrequent();
+    }
+    return query.offset == 0 || reader_.state().anchored == reader_.state().generation;
 }
 
 /* Deep pages of the whole library begin at the nearest anchor, if the anchors were set in the
  * very state of the catalogue that is being read. Where there is no anchor, there are no songs. */
 std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &query) {
-    if (query.offset == 0 || !isPlanKept(query)) {
+    if (query.offset == 0 || !conjuncts_.empty() || !isPlanKept(query)) {
         return std::nullopt;
     }
     const OrderTerm &leading = order.leading;
@@ -139,7 +150,7 @@ std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &que
     if (leading.descending && columns.size() > 1) {
         addStretch(sql.add("("), leading, true, kAnchorDistance + query.limit);
         addStretch(sql.add(" UNION ALL "), leading, false, kAnchorDistance + query.limit);
-        sql.add(") AS songs ORDER BY stretch, ");
+        sql.add(") AS songs ORDER BY ");
     } else {
         addComparison(sql.add("songs WHERE "), columns, leading.descending ? "<=" : ">=");
         sql.add(" ORDER BY ");
@@ -180,6 +191,9 @@ Sql SongPlan::songPage(const Query &query) {
     }
     if (isPlanKept(query)) {
         addLimit(sql, query.limit);
+        if (query.offset > 0) {
+            sql.add(" OFFSET ").bind(query.offset);
+        }
     } else {
         sql.addPage(query.offset, query.limit);
     }

@@ -33,6 +33,7 @@ class SongPlan {
   private:
     bool isRare() const { return rare_ != nullptr; }
     bool isPlanKept(const Query &query) const;
+    bool isFrequent() const;
     Sql songPage(const Query &query);
     Sql distinctPage(const Query &query);
     std::optional<Sql> anchored(const StoredOrder &order, const Query &query);

@@ -75,10 +75,9 @@ const State &Reader::state() {
 
 void Reader::beginSnapshot() {
     const std::string begin = std::string(kBegin) + "; EXECUTE ";
-    const Result rows =
-        withWordsForNoTable([&] { return connection_.run(begin + connection_.nameOf(kState)); });
-    isInSnapshot_ = true;
-    takeState(rows);
+    isInSnapshot_ = true;  // also when what follows its beginning fails
+    takeState(
+        withWordsForNoTable([&] { return connection_.run(begin + connection_.nameOf(kState)); }));
 }
 
 bool Reader::endSnapshot() noexcept {
@@ -99,36 +98,47 @@ std::optional<Result> Reader::answer(const Statement &statement) {
 }
 
 std::optional<Result> Reader::beginSnapshot(const Statement &statement) {
+    isInSnapshot_ = true;  // also when what follows its beginning fails
     auto results = connection_.runTogether({kBegin, kState}, statement.sql, statement.plan);
-    isInSnapshot_ = true;
     return takeState(results[1]) ? std::nullopt : std::optional(std::move(results[2]));
 }
 
 /* A role may have been given its rights before there was the table: then nothing is known. */
-const CommonGrams &Reader::gramsOf(Column column) {
+const Reader::Grams &Reader::gramsOf(Column column) {
     if (const auto known = grams_.find(column); known != grams_.end()) {
         return known->second;
     }
-    std::string bits;
+    if (isInSnapshot_) {  // which a refusal would end
+        static const Grams kNone;
+        return kNone;
+    }
+    Grams grams;
     try {
-        Sql sql = newSql("SELECT common FROM grams WHERE key=");
+        Sql sql = newSql("SELECT common, frequent FROM grams WHERE key=");
         const Result rows = connection_.run(sql.bind(std::string(columnInfo(column).key)));
-        bits = rows.size() > 0 ? std::string(rows[0].text(0)) : std::string();
+        if (rows.size() > 0) {
+            grams = {GramSet(std::string(rows[0].text(0))), GramSet(std::string(rows[0].text(1)))};
+        }
     } catch (const ServerError &error) {
         if (error.state() != kNoRight) {
             throw;
         }
     }
-    return grams_.emplace(column, CommonGrams(std::move(bits))).first->second;
+    return grams_.emplace(column, std::move(grams)).first->second;
 }
 
 bool Reader::isRare(const SearchTerm &term) {
     const auto &pieces = term.pattern.pieces();
-    const bool mayLook = !isInSnapshot_ || grams_.count(term.column) > 0;
-    return mayLook && std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
-               return piece.kind == Pattern::Piece::Kind::Literal && hasGram(piece.text) &&
-                      gramsOf(term.column).hasRareIn(piece.text);
-           });
+    return std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
+        return piece.kind == Pattern::Piece::Kind::Literal && hasTrigram(piece.text) &&
+               gramsOf(term.column).common.isKnown() &&
+               !gramsOf(term.column).common.hasEveryTrigramOf(piece.text);
+    });
+}
+
+bool Reader::isFrequent(const SearchTerm &term) {
+    const std::size_t gram = gramNumber(term.pattern.part().value_or(""));
+    return gram != 0 && gramsOf(term.column).frequent.has(gram);
 }
 
 /* Nearly always true of the music root. What all paths begin with is what the first and the last

@@ -54,19 +54,24 @@ class Reader {
     const State &state();
     /* Whether the path of every song begins so. */
     bool allPathsBegin(const std::string &prefix);
-    /* Whether no more than a few songs can be among the results of a search. */
+    /* Whether no more than a few songs can be among the results of a search; whether many are. */
     bool isRare(const SearchTerm &term);
+    bool isFrequent(const SearchTerm &term);
 
   private:
     bool takeState(const Result &rows);
-    const CommonGrams &gramsOf(Column column);
+    struct Grams {
+        GramSet common;    // that more than a few songs have
+        GramSet frequent;  // that many have
+    };
+    const Grams &gramsOf(Column column);
 
     Connection connection_;
     std::optional<State> state_;
     bool isInSnapshot_ = false;
     /* Of the songs at that generation. */
     std::optional<std::string> commonPrefix_;
-    std::map<Column, CommonGrams> grams_;
+    std::map<Column, Grams> grams_;
 };
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {

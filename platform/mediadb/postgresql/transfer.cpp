@@ -23,10 +23,13 @@ std::string textOf(Connection &connection, const char *sql) {
     return result.size() > 0 ? std::string(result[0].text(0)) : "";
 }
 
-/* An engine that only speaks PostgreSQL's protocol has no number for the server. */
+/* A standby that was promoted has the number of its former primary. An engine that only speaks
+ * PostgreSQL's protocol has none. */
 std::string serverOf(Connection &connection) {
     try {
-        return textOf(connection, "SELECT system_identifier FROM pg_control_system()");
+        return textOf(connection,
+                      "SELECT concat(system_identifier, ' ', pg_postmaster_start_time()) "
+                      "FROM pg_control_system()");
     } catch (const ServerError &) {
         return textOf(connection,
                       "SELECT concat(host(inet_server_addr()), ' ', inet_server_port())");
@@ -114,6 +117,7 @@ class PostgresqlReplacement : public Replacement {
         connection_.run(std::string(kPatience));
         connection_.run(std::string("BEGIN TRANSACTION ISOLATION LEVEL READ COMMITTED"));
         connection_.run(std::string(kLockWriting));
+        lockPlaylists();
     }
 
     std::string identity() override { return identity_; }
@@ -191,6 +195,21 @@ class PostgresqlReplacement : public Replacement {
     }
 
   private:
+    /* Programs that edit playlists do not take the lock on writing. An engine that only speaks
+     * PostgreSQL's protocol may know no such lock: what they save meanwhile may stay, then. */
+    void lockPlaylists() {
+        connection_.run(std::string("SAVEPOINT attempt"));
+        try {
+            connection_.run(
+                std::string("LOCK TABLE playlists, notices IN SHARE ROW EXCLUSIVE MODE"));
+        } catch (const ServerError &error) {
+            if (error.state() != "42601" && error.state() != "0A000") {
+                throw;
+            }
+            connection_.run(std::string("ROLLBACK TO attempt"));
+        }
+    }
+
     /* The rows of a table are one COPY. */
     CopyText &rowFor(const char *copy) {
         if (table_ != copy) {

@@ -165,6 +165,9 @@ TEST_F(PostgresqlPlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
         const std::string common = planOf("title ilike '%title%'", order, query);
         EXPECT_NE(common.find(" using songs_"), std::string::npos) << order << "\n" << common;
         EXPECT_EQ(common.find("Kept"), std::string::npos) << common;
+        const std::string frequent = planOf("title ilike '%ti%'", order, query);
+        EXPECT_EQ(frequent.find("Kept"), 0U) << frequent;
+        EXPECT_NE(frequent.find(" using songs_"), std::string::npos) << order << "\n" << frequent;
     }
 }
 

@@ -111,6 +111,19 @@ TEST_F(PostgresqlTest, ALostConnectionIsAnErrorAndTheNextQueryHasAnother) {
     EXPECT_EQ(rows(nullptr, "path").size(), 1200U);
 }
 
+TEST_F(PostgresqlTest, AQueryThatFailsSpoilsNoOther) {
+    index(location(), "/music/", 10);
+    for (const Page page : {Page{}, Page{0, 20}}) {
+        const auto search = [&] { return rows("title ilike '%t%'", "path", page); };
+        EXPECT_EQ(search().size(), 10U);
+        Cluster::run(location(), "ALTER TABLE zano.songs RENAME TO away");
+        EXPECT_EQ(search()[0].substr(0, 7), "failed:");
+        Cluster::run(location(), "ALTER TABLE zano.away RENAME TO songs");
+        EXPECT_EQ(search().size(), 10U);
+        EXPECT_EQ(rows(nullptr, "path").size(), 10U);
+    }
+}
+
 /* What all paths begin with is left out of a statement. */
 TEST_F(PostgresqlTest, AStatementForFormerSongsIsNotAnswered) {
     index(location(), "/music/", 10);

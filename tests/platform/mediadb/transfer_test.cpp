@@ -318,6 +318,16 @@ TEST_P(TransferTest, AnOlderSchemaIsBroughtUpToDate) {
     }
 }
 
+TEST(PostgresqlTransferTest, WritersOfPlaylistsAndNoticesWaitForACopy) {
+    const std::string place = Cluster::get().newDatabase();
+    const auto target = openReplacement(place);
+    EXPECT_EQ(Cluster::run(place,
+                           "SELECT count(*) FROM pg_locks WHERE mode='ShareRowExclusiveLock' AND "
+                           "granted AND relation IN ('zano.playlists'::regclass, "
+                           "'zano.notices'::regclass)"),
+              "2");
+}
+
 /* The grants that the documentation names. */
 TEST(PostgresqlTransferTest, AReaderMayCheckAndCopyFrom) {
     const files::Folder folder;
