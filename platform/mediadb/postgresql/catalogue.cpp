@@ -26,12 +26,13 @@ constexpr size_t kSongsAtOnce = 1000;
 constexpr size_t kSongsHeld = 20000;
 /* The planner's numbers are made anew when a fifth of the songs has come or gone. */
 constexpr std::int64_t kRecountShare = 5;
-/* So many songs tell which letters in a row are common, which are those of more than a few songs,
- * or of more than one in a thousand, and which are frequent. */
+/* So many songs tell which letters in a row are common: a walk along an order finds a page of the
+ * songs that have them sooner than the trigram index gives all of those, and for one or two, which
+ * have no trigram, sooner than a look at every song does. */
 constexpr double kSongsSampled = 50000;
 constexpr std::int64_t kFewSongs = 200;
-constexpr std::int64_t kFewShare = 1000;
-constexpr std::int64_t kManyShare = 20;
+constexpr std::int64_t kCommonShare = 150;
+constexpr std::int64_t kShortShare = 1000;
 constexpr std::array kSearched = {Column::Title, Column::Artist, Column::Album, Column::Genre};
 /* Held by who sets anchors; any number that all programs of this kind use. */
 constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
@@ -417,8 +418,10 @@ class PostgresqlCatalogue : public Catalogue {
         for (size_t column = 0; column < keys.size(); ++column) {
             const GramCounts &found = (*counts)[column];
             Sql sql = newSql("INSERT INTO grams VALUES(").bind(std::string(keys[column])).add(",");
-            sql.bind(found.moreThan(sampled(std::max(kFewSongs, songs / kFewShare))).bits());
-            sql.add(",").bind(found.moreThan(sampled(songs / kManyShare)).bits());
+            sql.bind(found
+                         .moreThan(sampled(std::max(kFewSongs, songs / kCommonShare)),
+                                   sampled(songs / kShortShare))
+                         .bits());
             connection_.run(sql.add(")"));
         }
     }

@@ -4,7 +4,6 @@ namespace zano::mediadb::postgresql {
 namespace {
 
 constexpr std::size_t kBits = 8;
-constexpr std::size_t kSymbols = 37;  // with 0 for none
 constexpr std::size_t kLongest = 3;
 
 std::size_t symbolOf(char character) {
@@ -29,7 +28,7 @@ bool anyGram(std::string_view text, const Callback &callback) {
             if (symbol == 0) {
                 break;
             }
-            number = number * kSymbols + symbol;
+            number = number * kGramSymbols + symbol;
             if (callback(number, length)) {
                 return true;
             }
@@ -78,10 +77,10 @@ void GramCounts::add(std::string_view key) {
     });
 }
 
-GramSet GramCounts::moreThan(std::int64_t keys) const {
+GramSet GramCounts::moreThan(std::int64_t keysOfThree, std::int64_t keysOfFewer) const {
     GramSet grams;
     for (std::size_t gram = 1; gram < kGramNumbers; ++gram) {
-        if (counts_[gram] > keys) {
+        if (counts_[gram] > (gram >= kGramSymbols * kGramSymbols ? keysOfThree : keysOfFewer)) {
             grams.add(gram);
         }
     }

@@ -17,7 +17,8 @@ namespace zano::mediadb::postgresql {
 
 /* One to three of them in a row, in a number; 0 for any other text. */
 std::size_t gramNumber(std::string_view text);
-constexpr std::size_t kGramNumbers = 37 * 37 * 37;
+constexpr std::size_t kGramSymbols = 37;  // with 0 for none
+constexpr std::size_t kGramNumbers = kGramSymbols * kGramSymbols * kGramSymbols;
 
 /* Whether there are three in a row somewhere. */
 bool hasTrigram(std::string_view text);
@@ -42,8 +43,8 @@ class GramSet {
 class GramCounts {
   public:
     void add(std::string_view key);
-    /* What more than so many keys have. */
-    GramSet moreThan(std::int64_t keys) const;
+    /* What more than so many keys have: three in a row, and fewer. */
+    GramSet moreThan(std::int64_t keysOfThree, std::int64_t keysOfFewer) const;
 
   private:
     std::array<std::uint32_t, kGramNumbers> counts_{};

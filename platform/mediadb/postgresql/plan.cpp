@@ -47,6 +47,16 @@ void addComparison(Sql &sql, const std::vector<std::string_view> &columns, std::
     sql.add(")");
 }
 
+/* Not in the words of the trigram index, which would be asked for all songs of frequent letters. */
+void addWalked(Sql &sql, const std::vector<SearchTerm> &searches) {
+    std::string_view separator;
+    for (const SearchTerm &term : searches) {
+        sql.add(separator).add("songs.").add(columnInfo(term.column).key).add("||'' LIKE ");
+        sql.bind(term.pattern.likeText());
+        separator = " OR ";
+    }
+}
+
 /* A number of ours as text: a plan that is kept has to know how few rows are wanted. */
 void addLimit(Sql &sql, std::int64_t rows) {
     sql.add(" LIMIT ").add(std::to_string(rows));
@@ -91,7 +101,7 @@ SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
 
 /* The table and the condition. What only a few songs meet is found first and by itself (OFFSET 0
  * keeps it apart), for a plan that is kept would not know that they are few. */
-void SongPlan::addSongs(Sql &sql) {
+void SongPlan::addSongs(Sql &sql, bool isWalk) {
     sql.add(" FROM ");
     if (isRare()) {
         sql.add("(SELECT * FROM songs WHERE ").addCondition(*rare_->expression, "songs.");
@@ -99,6 +109,10 @@ void SongPlan::addSongs(Sql &sql) {
     }
     sql.add("songs");
     std::string_view word = " WHERE ";
+    if (isWalk) {
+        addWalked(sql.add(word), conjuncts_[0].searches);
+        return;
+    }
     for (const Conjunct &conjunct : conjuncts_) {
         if (&conjunct != rare_) {
             sql.add(word).addCondition(*conjunct.expression, "songs.");
@@ -180,7 +194,7 @@ Sql SongPlan::songPage(const Query &query) {
         }
     }
     Sql sql = newSql("SELECT ").add(columnList(query.select, "songs."));
-    addSongs(sql);
+    addSongs(sql, !conjuncts_.empty() && isPlanKept(query));
     sql.add(" ORDER BY ");
     if (query.random) {
         sql.add("random()");

@@ -38,7 +38,7 @@ class SongPlan {
     Sql distinctPage(const Query &query);
     std::optional<Sql> anchored(const StoredOrder &order, const Query &query);
     std::int64_t countOutside(const std::string &prefix, std::int64_t bound);
-    void addSongs(Sql &sql);
+    void addSongs(Sql &sql, bool isWalk = false);
 
     Reader &reader_;
     std::vector<Conjunct> conjuncts_;

@@ -104,20 +104,20 @@ std::optional<Result> Reader::beginSnapshot(const Statement &statement) {
 }
 
 /* A role may have been given its rights before there was the table: then nothing is known. */
-const Reader::Grams &Reader::gramsOf(Column column) {
+const GramSet &Reader::gramsOf(Column column) {
     if (const auto known = grams_.find(column); known != grams_.end()) {
         return known->second;
     }
     if (isInSnapshot_) {  // which a refusal would end
-        static const Grams kNone;
+        static const GramSet kNone;
         return kNone;
     }
-    Grams grams;
+    GramSet grams;
     try {
-        Sql sql = newSql("SELECT common, frequent FROM grams WHERE key=");
+        Sql sql = newSql("SELECT common FROM grams WHERE key=");
         const Result rows = connection_.run(sql.bind(std::string(columnInfo(column).key)));
         if (rows.size() > 0) {
-            grams = {GramSet(std::string(rows[0].text(0))), GramSet(std::string(rows[0].text(1)))};
+            grams = GramSet(std::string(rows[0].text(0)));
         }
     } catch (const ServerError &error) {
         if (error.state() != kNoRight) {
@@ -131,14 +131,14 @@ bool Reader::isRare(const SearchTerm &term) {
     const auto &pieces = term.pattern.pieces();
     return std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
         return piece.kind == Pattern::Piece::Kind::Literal && hasTrigram(piece.text) &&
-               gramsOf(term.column).common.isKnown() &&
-               !gramsOf(term.column).common.hasEveryTrigramOf(piece.text);
+               gramsOf(term.column).isKnown() &&
+               !gramsOf(term.column).hasEveryTrigramOf(piece.text);
     });
 }
 
 bool Reader::isFrequent(const SearchTerm &term) {
     const std::size_t gram = gramNumber(term.pattern.part().value_or(""));
-    return gram != 0 && gramsOf(term.column).frequent.has(gram);
+    return gram != 0 && gramsOf(term.column).has(gram);
 }
 
 /* Nearly always true of the music root. What all paths begin with is what the first and the last

@@ -60,18 +60,14 @@ class Reader {
 
   private:
     bool takeState(const Result &rows);
-    struct Grams {
-        GramSet common;    // that more than a few songs have
-        GramSet frequent;  // that many have
-    };
-    const Grams &gramsOf(Column column);
+    const GramSet &gramsOf(Column column);
 
     Connection connection_;
     std::optional<State> state_;
     bool isInSnapshot_ = false;
     /* Of the songs at that generation. */
     std::optional<std::string> commonPrefix_;
-    std::map<Column, Grams> grams_;
+    std::map<Column, GramSet> grams_;
 };
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {

@@ -53,7 +53,7 @@ CREATE FUNCTION zano.zano_text(bytea) RETURNS text LANGUAGE plpgsql IMMUTABLE ST
                                                                   /* Anchors are set anew with the
                                                                      first trigrams. */
                                                                   R"sql(
-CREATE TABLE zano.grams(key text PRIMARY KEY, common bytea NOT NULL, frequent bytea NOT NULL);
+CREATE TABLE zano.grams(key text PRIMARY KEY, common bytea NOT NULL);
 UPDATE zano.state SET value=-1 WHERE name='anchored';
 )sql"};
 
