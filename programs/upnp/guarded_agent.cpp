@@ -19,7 +19,8 @@ constexpr std::string_view kMark = "late ";
 constexpr unsigned int kMostStart = 400;
 constexpr int kMostLooks = 40;
 constexpr int kNextLookMs = 10;
-constexpr suseconds_t kTickUs = 100'000;
+constexpr suseconds_t kTickUs = 10'000;
+constexpr int kTicksOfALook = 10;
 constexpr int kPerSecond = 1000;
 
 /* In the place of an "&" that holds the decoder up: no XML has this byte. */
@@ -34,6 +35,7 @@ struct Guarded {
     std::array<char, kMostStart> start{};
     std::size_t startSize = 0;
     int looks = 0;
+    int ticks = 0;
 };
 Guarded guarded;
 
@@ -101,15 +103,22 @@ void report() {
 
 /* Memory that has run out leaves no buffer at all. */
 void onLate(int) {
-    if (takeStart() || ++guarded.looks > kMostLooks) {
+    if (takeStart() || guarded.startSize == kMostStart || ++guarded.looks > kMostLooks) {
         report();
     }
     startTimer(ITIMER_REAL, 0, kNextLookMs);
 }
 
-/* Comes after so much time of the processor. Where nothing arrived in one of these while an answer
- * is there, it is the decoder that took it. */
+/* Comes after so much time of the processor. A large buffer is nearly always on the move, so its
+ * start is taken early. Where nothing arrived in some of these while an answer is there, it is the
+ * decoder that took them. */
 void onTick(int signal) {
+    if (guarded.startSize < kMostStart) {
+        takeStart();
+    }
+    if (++guarded.ticks % kTicksOfALook != 0) {
+        return;
+    }
     const unsigned int size = guarded.agent->responseSize;
     if (LateAnswer{size, {}}.isTooLarge()) {
         onLate(signal);
