@@ -4,6 +4,7 @@
 #include <vorelix/upnp/dmaparser.h>
 
 #include <algorithm>
+#include <cstdint>
 #include <cstdlib>
 #include <cstring>
 #include <limits>
@@ -51,19 +52,22 @@ class Allowance {
         return isEnough;
     }
 
-    /* The text itself, or "" when it is too long. */
-    const char *spendOn(const char *text) {
-        const std::size_t size = strnlen(text, std::min(left_ + 1, looks_));
+    bool spendLengthOf(const char *text) {
+        const std::size_t size =
+            strnlen(text, static_cast<std::size_t>(std::min<std::uint64_t>(left_ + 1, looks_)));
         const bool isSeen = size < looks_;
         looks_ -= size;
-        return isSeen && spend(size) ? text : "";
+        return isSeen && spend(size);
     }
 
+    /* The text itself, or "" when it is too long. */
+    const char *spendOn(const char *text) { return spendLengthOf(text) ? text : ""; }
+
   private:
-    static constexpr std::size_t kLooks = 16;
+    static constexpr std::uint64_t kLooks = 16;
 
     std::size_t left_;
-    std::size_t looks_;
+    std::uint64_t looks_;
 };
 
 /* As strtol gives it where a long has 32 bits. */
@@ -112,12 +116,12 @@ class DocumentReader {
                       int namespaceCount, const xmlChar **namespaces, int attributeCount,
                       int defaultedCount, const xmlChar **attributes) {
         DocumentReader &reader = of(context);
-        std::size_t bytes = kShortestNamespace * static_cast<std::size_t>(namespaceCount);
-        for (int i = 0; i < 2 * namespaceCount; ++i) {
-            bytes += std::strlen(textOf(namespaces[i]));
+        bool isEnough =
+            reader.allowance_.spend(kShortestNamespace * static_cast<std::size_t>(namespaceCount));
+        for (int i = 0; isEnough && i < 2 * namespaceCount; ++i) {
+            isEnough = reader.allowance_.spendLengthOf(textOf(namespaces[i]));
         }
-        reader.startElement_(context, name, prefix, uri,
-                             reader.allowance_.spend(bytes) ? namespaceCount : 0, namespaces,
+        reader.startElement_(context, name, prefix, uri, isEnough ? namespaceCount : 0, namespaces,
                              attributeCount, defaultedCount, attributes);
     }
 

@@ -13,6 +13,8 @@ namespace {
 constexpr std::int64_t kOutsideBound = 20000;
 /* Of a page that comes from an index; longer ones are fetched piece by piece. */
 constexpr std::int64_t kLongestAnchoredPage = 1000;
+/* So many results are looked for along an order, where that is known to be short. */
+constexpr std::int64_t kLongestWalk = 200;
 
 std::optional<OrderTerm> leadingOf(const std::vector<OrderTerm> &order) {
     if (order.empty()) {
@@ -137,7 +139,7 @@ bool SongPlan::isPlanKept(const Query &query) const {
         return false;
     }
     if (!conjuncts_.empty()) {
-        return query.offset <= kLongestAnchoredPage && isFrequent();
+        return query.offset + query.limit <= kLongestWalk && isFrequent();
     }
     return query.offset == 0 || reader_.state().anchored == reader_.state().generation;
 }

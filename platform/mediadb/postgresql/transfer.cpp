@@ -27,9 +27,10 @@ std::string textOf(Connection &connection, const char *sql) {
  * PostgreSQL's protocol has none. */
 std::string serverOf(Connection &connection) {
     try {
-        return textOf(connection,
-                      "SELECT concat(system_identifier, ' ', pg_postmaster_start_time()) "
-                      "FROM pg_control_system()");
+        return textOf(
+            connection,
+            "SELECT concat(system_identifier, ' ', extract(epoch FROM pg_postmaster_start_time())) "
+            "FROM pg_control_system()");
     } catch (const ServerError &) {
         return textOf(connection,
                       "SELECT concat(host(inet_server_addr()), ' ', inet_server_port())");
