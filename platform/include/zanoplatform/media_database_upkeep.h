@@ -61,10 +61,10 @@ ZANOPLATFORM_API int MediaInfoDBMigrate(const char *location, MEDIA_DB_MIGRATED 
  * whatever their engines are; ids that one of the two has given are not given again. A missing
  * database is made, but not the PostgreSQL database that it stands in. `to` must not hold songs,
  * playlists or notices (KLIB_ERR_DATABASE_FILLED), unless replace is set. All of it becomes visible
- * at once: until then `to` is as it was, and stays so after a failure or the end of the process (one
- * that was missing is there then, and empty); other writers wait. Then the orders and the search index are made; should that fail, the copy is whole
- * and MediaInfoDBMigrate() does the rest. 0 with *result (unless null), or -1. progress may be
- * null. */
+ * at once: until then `to` is as it was, and stays so after a failure or the end of the process
+ * (one that was missing is there then, and empty); other writers wait. Then the orders and the
+ * search index are made; should that fail, the copy is whole and MediaInfoDBMigrate() does the
+ * rest. 0 with *result (unless null), or -1. progress may be null. */
 ZANOPLATFORM_API int MediaInfoDBCopy(const char *from, const char *to, int replace,
                                      MEDIA_DB_CONTENTS *result, MEDIA_DB_PROGRESS progress,
                                      void *context);
