@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <array>
+#include <cmath>
 #include <cstdlib>
 #include <memory>
 #include <span>
@@ -26,13 +27,15 @@ constexpr size_t kSongsAtOnce = 1000;
 constexpr size_t kSongsHeld = 20000;
 /* The planner's numbers are made anew when a fifth of the songs has come or gone. */
 constexpr std::int64_t kRecountShare = 5;
-/* So many songs tell which letters in a row are common: a walk along an order finds a page of the
- * songs that have them sooner than the trigram index gives all of those, and for one or two, which
- * have no trigram, sooner than a look at every song does. */
+/* So many songs tell how many have which letters in a row. */
 constexpr double kSongsSampled = 50000;
+/* The trigram index gives n songs in the time of n rows, which lie anywhere. A walk in the index of
+ * an order finds a page of 50 of them after 50 * all / n entries, and a row takes about as long as
+ * eight of those: both are alike where n * n is this times all. */
+constexpr double kEvenSquare = 6.5;
 constexpr std::int64_t kFewSongs = 200;
-constexpr std::int64_t kCommonShare = 150;
-constexpr std::int64_t kShortShare = 1000;
+/* The entries of a page with more songs than these between are looked at before their rows. */
+constexpr std::int64_t kManyShare = 16;
 constexpr std::array kSearched = {Column::Title, Column::Artist, Column::Album, Column::Genre};
 /* Held by who sets anchors; any number that all programs of this kind use. */
 constexpr const char *kLockAnchors = "SELECT pg_advisory_lock(1517118562, 2)";
@@ -415,13 +418,12 @@ class PostgresqlCatalogue : public Catalogue {
         const auto sampled = [share](std::int64_t number) {
             return static_cast<std::int64_t>(static_cast<double>(number) * share);
         };
+        const double even = std::sqrt(kEvenSquare * static_cast<double>(songs));
+        const std::int64_t few = sampled(std::max(kFewSongs, static_cast<std::int64_t>(even)));
+        const std::int64_t many = sampled(std::max(kFewSongs, songs / kManyShare));
         for (size_t column = 0; column < keys.size(); ++column) {
-            const GramCounts &found = (*counts)[column];
             Sql sql = newSql("INSERT INTO grams VALUES(").bind(std::string(keys[column])).add(",");
-            sql.bind(found
-                         .moreThan(sampled(std::max(kFewSongs, songs / kCommonShare)),
-                                   sampled(songs / kShortShare))
-                         .bits());
+            sql.bind((*counts)[column].shares(few, many).bits());
             connection_.run(sql.add(")"));
         }
     }

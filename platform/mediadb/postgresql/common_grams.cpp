@@ -1,9 +1,12 @@
 #include "common_grams.h"
 
+#include <algorithm>
+
 namespace zano::mediadb::postgresql {
 namespace {
 
-constexpr std::size_t kBits = 8;
+constexpr std::size_t kInByte = 4;
+constexpr unsigned kMask = 3;
 constexpr std::size_t kLongest = 3;
 
 std::size_t symbolOf(char character) {
@@ -52,20 +55,27 @@ bool hasTrigram(std::string_view text) {
     return anyGram(text, [](std::size_t, std::size_t length) { return length == kLongest; });
 }
 
-bool GramSet::has(std::size_t gram) const {
-    return gram / kBits < bits_.size() &&
-           (static_cast<unsigned char>(bits_[gram / kBits]) >> gram % kBits & 1U) != 0;
+Share GramShares::of(std::size_t gram) const {
+    if (gram / kInByte >= bits_.size()) {
+        return Share::Few;
+    }
+    const auto byte = static_cast<unsigned char>(bits_[gram / kInByte]);
+    return static_cast<Share>(byte >> gram % kInByte * 2 & kMask);
 }
 
-bool GramSet::hasEveryTrigramOf(std::string_view text) const {
-    return !anyGram(text, [this](std::size_t gram, std::size_t length) {
-        return length == kLongest && !has(gram);
+std::optional<Share> GramShares::leastIn(std::string_view text) const {
+    std::optional<Share> least;
+    anyGram(text, [&](std::size_t gram, std::size_t) {
+        least = std::min(least.value_or(Share::Many), of(gram));
+        return least == Share::Few;
     });
+    return isKnown() ? least : std::nullopt;
 }
 
-void GramSet::add(std::size_t gram) {
-    bits_.resize((kGramNumbers + kBits - 1) / kBits);
-    bits_[gram / kBits] = static_cast<char>(bits_[gram / kBits] | 1 << gram % kBits);
+void GramShares::set(std::size_t gram, Share share) {
+    bits_.resize((kGramNumbers + kInByte - 1) / kInByte);
+    char &byte = bits_[gram / kInByte];
+    byte = static_cast<char>(byte | static_cast<unsigned>(share) << gram % kInByte * 2);
 }
 
 void GramCounts::add(std::string_view key) {
@@ -77,14 +87,13 @@ void GramCounts::add(std::string_view key) {
     });
 }
 
-GramSet GramCounts::moreThan(std::int64_t keysOfThree, std::int64_t keysOfFewer) const {
-    GramSet grams;
-    for (std::size_t gram = 1; gram < kGramNumbers; ++gram) {
-        if (counts_[gram] > (gram >= kGramSymbols * kGramSymbols ? keysOfThree : keysOfFewer)) {
-            grams.add(gram);
-        }
+GramShares GramCounts::shares(std::int64_t few, std::int64_t many) const {
+    GramShares shares;
+    for (std::size_t gram = 0; gram < kGramNumbers; ++gram) {
+        const std::int64_t count = counts_[gram];
+        shares.set(gram, count > many ? Share::Many : count > few ? Share::Some : Share::Few);
     }
-    return grams;
+    return shares;
 }
 
 }  // namespace zano::mediadb::postgresql

@@ -1,7 +1,5 @@
 /* How many songs have which few letters in a row, as far as it is good to know before a search is
- * made: where a search can find only a few songs, or nearly fills a page wherever it begins, one
- * plan serves all searches of the kind, and making one for its words takes longer than the rest.
- * Stale knowledge costs time alone.
+ * made: which way is the shortest depends on it. Stale knowledge costs time alone.
  *
  * Only the letters a to z and digits count: what else belongs to a word depends on the locale of
  * the server. */
@@ -9,6 +7,7 @@
 
 #include <array>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -23,16 +22,22 @@ constexpr std::size_t kGramNumbers = kGramSymbols * kGramSymbols * kGramSymbols;
 /* Whether there are three in a row somewhere. */
 bool hasTrigram(std::string_view text);
 
-/* A bit for each number. */
-class GramSet {
+/* Few: all songs that have it are found sooner than a walk along an order comes by a page of them.
+ * Many: such a walk is not much longer than the page. */
+enum class Share : unsigned char { Few, Some, Many };
+
+/* Of each number, in two bits. */
+class GramShares {
   public:
-    GramSet() = default;
-    explicit GramSet(std::string bits) : bits_(std::move(bits)) {}
+    GramShares() = default;
+    explicit GramShares(std::string bits) : bits_(std::move(bits)) {}
 
     bool isKnown() const { return !bits_.empty(); }
-    bool has(std::size_t gram) const;
-    bool hasEveryTrigramOf(std::string_view text) const;
-    void add(std::size_t gram);
+    Share of(std::size_t gram) const;
+    /* Of what the text has that the fewest songs have: no more songs have the text itself. Null:
+     * there is nothing in it that has a number, or nothing is known. */
+    std::optional<Share> leastIn(std::string_view text) const;
+    void set(std::size_t gram, Share share);
     const std::string &bits() const { return bits_; }
 
   private:
@@ -43,8 +48,8 @@ class GramSet {
 class GramCounts {
   public:
     void add(std::string_view key);
-    /* What more than so many keys have: three in a row, and fewer. */
-    GramSet moreThan(std::int64_t keysOfThree, std::int64_t keysOfFewer) const;
+    /* Few are so many keys at most, many are more than so many. */
+    GramShares shares(std::int64_t few, std::int64_t many) const;
 
   private:
     std::array<std::uint32_t, kGramNumbers> counts_{};

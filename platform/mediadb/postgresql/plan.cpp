@@ -13,8 +13,10 @@ namespace {
 constexpr std::int64_t kOutsideBound = 20000;
 /* Of a page that comes from an index; longer ones are fetched piece by piece. */
 constexpr std::int64_t kLongestAnchoredPage = 1000;
-/* So many results are looked for along an order, where that is known to be short. */
+/* So many results are looked for along an order, row by row. */
 constexpr std::int64_t kLongestWalk = 200;
+/* And in its index alone. */
+constexpr std::int64_t kLongestWalkOfKeys = 100;
 
 std::optional<OrderTerm> leadingOf(const std::vector<OrderTerm> &order) {
     if (order.empty()) {
@@ -49,17 +51,59 @@ void addComparison(Sql &sql, const std::vector<std::string_view> &columns, std::
     sql.add(")");
 }
 
-/* Not in the words of the trigram index, which would be asked for all songs of frequent letters. */
+/* How many songs have what is searched for; null: it is not known. */
+std::optional<Share> shareOf(Reader &reader, const SearchTerm &term) {
+    const GramShares &grams = reader.gramsOf(term.column);
+    const std::size_t gram = gramNumber(term.pattern.part().value_or(""));
+    return gram != 0 && grams.isKnown() ? std::optional(grams.of(gram)) : std::nullopt;
+}
+
+/* How many have it at most. */
+std::optional<Share> mostOf(Reader &reader, const SearchTerm &term) {
+    std::optional<Share> most;
+    for (const Pattern::Piece &piece : term.pattern.pieces()) {
+        if (const auto share = reader.gramsOf(term.column).leastIn(piece.text)) {
+            most = std::min(most.value_or(Share::Many), *share);
+        }
+    }
+    return most;
+}
+
+/* Found by the trigram index, and soon. */
+bool isRare(Reader &reader, const SearchTerm &term) {
+    const auto &pieces = term.pattern.pieces();
+    return std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
+        return hasTrigram(piece.text) &&
+               reader.gramsOf(term.column).leastIn(piece.text) == Share::Few;
+    });
+}
+
+bool isIndexed(const std::vector<SearchTerm> &searches, Column leading) {
+    const auto columns = indexedColumns(leading);
+    return std::all_of(searches.begin(), searches.end(), [&columns](const SearchTerm &term) {
+        return std::count(columns.begin(), columns.end(), columnInfo(term.column).key) > 0;
+    });
+}
+
+/* Not in the words of the trigram index, which would be asked for all songs of frequent letters.
+ * Of what else keeps it out, strpos takes the least time for a song. */
 void addWalked(Sql &sql, const std::vector<SearchTerm> &searches) {
     std::string_view separator;
     for (const SearchTerm &term : searches) {
-        sql.add(separator).add("songs.").add(columnInfo(term.column).key).add("||'' LIKE ");
-        sql.bind(term.pattern.likeText());
+        const std::string_view key = columnInfo(term.column).key;
+        if (const auto part = term.pattern.part()) {
+            sql.add(separator).add("strpos(songs.").add(key).add(",").bind(std::string(*part));
+            sql.add(")>0");
+        } else {
+            sql.add(separator).add("songs.").add(key).add("||'' LIKE ");
+            sql.bind(term.pattern.likeText());
+        }
         separator = " OR ";
     }
 }
 
-/* A number of ours as text: a plan that is kept has to know how few rows are wanted. */
+/* A number of ours as text: a plan that is kept has to know how few rows are wanted, or it sorts.
+ */
 void addLimit(Sql &sql, std::int64_t rows) {
     sql.add(" LIMIT ").add(std::to_string(rows));
 }
@@ -95,7 +139,7 @@ SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
         std::find_if(conjuncts_.begin(), conjuncts_.end(), [&reader](const Conjunct &conjunct) {
             const auto &terms = conjunct.searches;
             return !terms.empty() && std::all_of(terms.begin(), terms.end(), [&](const auto &term) {
-                return reader.isRare(term);
+                return isRare(reader, term);
             });
         });
     rare_ = rare != conjuncts_.end() ? &*rare : nullptr;
@@ -103,15 +147,15 @@ SongPlan::SongPlan(Reader &reader, const std::optional<Expression> &condition)
 
 /* The table and the condition. What only a few songs meet is found first and by itself (OFFSET 0
  * keeps it apart), for a plan that is kept would not know that they are few. */
-void SongPlan::addSongs(Sql &sql, bool isWalk) {
+void SongPlan::addSongs(Sql &sql, bool isWalk) const {
     sql.add(" FROM ");
-    if (isRare()) {
+    if (rare_ != nullptr) {
         sql.add("(SELECT * FROM songs WHERE ").addCondition(*rare_->expression, "songs.");
         sql.add(" OFFSET 0) AS ");
     }
     sql.add("songs");
     std::string_view word = " WHERE ";
-    if (isWalk) {
+    if (isWalk && !conjuncts_.empty()) {
         addWalked(sql.add(word), conjuncts_[0].searches);
         return;
     }
@@ -123,33 +167,49 @@ void SongPlan::addSongs(Sql &sql, bool isWalk) {
     }
 }
 
-/* A search whose results fill a page in a short walk along any order. */
-bool SongPlan::isFrequent() const {
-    return conjuncts_.size() == 1 &&
-           std::any_of(conjuncts_[0].searches.begin(), conjuncts_[0].searches.end(),
-                       [this](const SearchTerm &term) { return reader_.isFrequent(term); });
+SongPlan::Way SongPlan::wayOfSearch(std::int64_t results, Column leading) const {
+    if (conjuncts_.size() != 1 || rare_ != nullptr || results > kLongestAnchoredPage) {
+        return Way::Planned;
+    }
+    const auto &searches = conjuncts_[0].searches;
+    const auto anyOf = [&](const auto &isSo) {
+        return std::any_of(searches.begin(), searches.end(), isSo);
+    };
+    if (anyOf([&](const auto &term) { return shareOf(reader_, term) == Share::Many; })) {
+        return results <= kLongestWalk ? Way::Walk : Way::Planned;
+    }
+    if (searches.empty() || !isIndexed(searches, leading) ||
+        anyOf([&](const auto &term) { return mostOf(reader_, term) == Share::Many; })) {
+        return Way::Planned;
+    }
+    const bool isWalk = results <= kLongestWalkOfKeys && anyOf([&](const auto &term) {
+                            return shareOf(reader_, term) == Share::Some;
+                        });
+    return isWalk ? Way::WalkOfKeys : Way::PlannedKeys;
 }
 
-/* What an index gives from a known place on, whatever the values. */
-bool SongPlan::isPlanKept(const Query &query) const {
+SongPlan::Way SongPlan::wayOf(const Query &query) const {
+    if (rare_ != nullptr) {
+        return Way::Rare;
+    }
     const auto leading = leadingOf(query.order);
     const bool isInOrder = leading && findStoredOrder(*leading) != nullptr;
     const bool isShort = query.limit > 0 && query.limit <= kLongestAnchoredPage;
-    if (query.random || query.distinct || !isInOrder || !isShort) {
-        return false;
+    if (query.random || !isInOrder || !isShort) {
+        return Way::Planned;
     }
     if (!conjuncts_.empty()) {
-        return query.offset + query.limit <= kLongestWalk && isFrequent();
+        return wayOfSearch(query.offset + query.limit, leading->column);
     }
-    return query.offset == 0 || reader_.state().anchored == reader_.state().generation;
+    if (query.offset == 0) {
+        return Way::Walk;
+    }
+    return reader_.state().anchored == reader_.state().generation ? Way::Anchored : Way::Planned;
 }
 
 /* Deep pages of the whole library begin at the nearest anchor, if the anchors were set in the
  * very state of the catalogue that is being read. Where there is no anchor, there are no songs. */
-std::optional<Sql> SongPlan::anchored(const StoredOrder &order, const Query &query) {
-    if (query.offset == 0 || !conjuncts_.empty() || !isPlanKept(query)) {
-        return std::nullopt;
-    }
+Sql SongPlan::anchored(const StoredOrder &order, const Query &query) const {
     const OrderTerm &leading = order.leading;
     const std::int64_t skipped = query.offset % kAnchorDistance;
     const auto columns = placeColumns(leading.column);
@@ -183,20 +243,51 @@ Statement SongPlan::page(const Query &query) {
     if (query.distinct) {
         return {distinctPage(query)};
     }
-    const bool isKept = isPlanKept(query) || isRare();
-    return {songPage(query), isKept ? Connection::Plan::Kept : Connection::Plan::ForValues};
+    const Way way = wayOf(query);
+    const bool isForValues = way == Way::Planned || way == Way::PlannedKeys;
+    return {songPage(query, way),
+            isForValues ? Connection::Plan::ForValues : Connection::Plan::Kept};
 }
 
-Sql SongPlan::songPage(const Query &query) {
+/* Most songs along an order need not be looked at where its index knows the searched keys: what
+ * the first results have in the index tells which rows to fetch. Rows that are equal by it come
+ * with them and are cut off when all are in order. */
+Sql SongPlan::keyPage(const OrderTerm &leading, const Query &query, bool isWalk) const {
+    const auto columns = indexedColumns(leading.column);
+    std::string keys;
+    for (const std::string_view column : columns) {
+        keys.append(keys.empty() ? "" : ", ").append(column);
+    }
+    Sql sql =
+        newSql("SELECT ").add(columnList(query.select, "songs.")).add(" FROM (SELECT DISTINCT ");
+    addSongs(sql.add(keys).add(" FROM (SELECT ").add(keys), isWalk);
+    sql.add(" ORDER BY ").add(columns[0]).add(leading.descending ? " DESC" : "");
+    for (auto column = columns.begin() + 1; column != columns.end(); ++column) {
+        sql.add(", ").add(*column);
+    }
+    std::int64_t results = query.limit;
+    while (results < query.offset + query.limit) {
+        results *= 2;  // so that few statements are prepared
+    }
+    addLimit(sql, results);
+    sql.add(") AS results) AS results JOIN songs USING(")
+        .add(keys)
+        .add(") ORDER BY ")
+        .add(orderText(leading, "songs."));
+    sql.addPage(query.offset, query.limit);
+    return sql;
+}
+
+Sql SongPlan::songPage(const Query &query, Way way) const {
     const auto leading = leadingOf(query.order);
-    const StoredOrder *stored = leading ? findStoredOrder(*leading) : nullptr;
-    if (stored != nullptr) {
-        if (auto deep = anchored(*stored, query)) {
-            return std::move(*deep);
-        }
+    if (way == Way::Anchored) {
+        return anchored(*findStoredOrder(*leading), query);
+    }
+    if (way == Way::WalkOfKeys || way == Way::PlannedKeys) {
+        return keyPage(*leading, query, way == Way::WalkOfKeys);
     }
     Sql sql = newSql("SELECT ").add(columnList(query.select, "songs."));
-    addSongs(sql, !conjuncts_.empty() && isPlanKept(query));
+    addSongs(sql, way == Way::Walk);
     sql.add(" ORDER BY ");
     if (query.random) {
         sql.add("random()");
@@ -205,18 +296,16 @@ Sql SongPlan::songPage(const Query &query) {
     } else {
         sql.addFullOrder(query.order, "songs.");
     }
-    if (isPlanKept(query)) {
+    if (way == Way::Walk) {
         addLimit(sql, query.limit);
-        if (query.offset > 0) {
-            sql.add(" OFFSET ").bind(query.offset);
-        }
+        sql.add(" OFFSET ").add(std::to_string(query.offset));
     } else {
         sql.addPage(query.offset, query.limit);
     }
     return sql;
 }
 
-Sql SongPlan::distinctPage(const Query &query) {
+Sql SongPlan::distinctPage(const Query &query) const {
     const ColumnInfo &info = columnInfo(*query.distinct);
     Sql sql = newSql("SELECT ").add(columnList(query.select, "songs."));
     addSongs(sql.add(" FROM songs WHERE songs.id IN (SELECT min(songs.id)"));
@@ -260,7 +349,7 @@ std::optional<Statement> SongPlan::countStatement(std::optional<Column> distinct
         sql.add("*)");
     }
     addSongs(sql);
-    return Statement{sql, isRare() ? Connection::Plan::Kept : Connection::Plan::ForValues};
+    return Statement{sql, rare_ != nullptr ? Connection::Plan::Kept : Connection::Plan::ForValues};
 }
 
 std::int64_t SongPlan::count(std::optional<Column> distinct) {

@@ -1,6 +1,6 @@
 /* Turns a parsed query on the songs into statements. Which index serves a search is left to
- * PostgreSQL, which knows how often words come, but for searches that are known to find only a few
- * songs; deep pages and counts are helped. */
+ * PostgreSQL, which knows how often words come, where a few letters do not tell already; deep pages
+ * and counts are helped. */
 #pragma once
 
 #include <optional>
@@ -31,14 +31,23 @@ class SongPlan {
     bool isUnconditional() const { return conjuncts_.empty(); }
 
   private:
-    bool isRare() const { return rare_ != nullptr; }
-    bool isPlanKept(const Query &query) const;
-    bool isFrequent() const;
-    Sql songPage(const Query &query);
-    Sql distinctPage(const Query &query);
-    std::optional<Sql> anchored(const StoredOrder &order, const Query &query);
+    /* How songs are come by. But for what the server plans for the values one plan serves all. */
+    enum class Way {
+        Planned,
+        Rare,         // from the trigram index
+        Walk,         // along the index of the order
+        Anchored,     // likewise, from an anchor on
+        WalkOfKeys,   // in that index alone, then the rows of what is found
+        PlannedKeys,  // their keys as planned, then the rows
+    };
+    Way wayOf(const Query &query) const;
+    Way wayOfSearch(std::int64_t results, Column leading) const;
+    Sql songPage(const Query &query, Way way) const;
+    Sql keyPage(const OrderTerm &leading, const Query &query, bool isWalk) const;
+    Sql distinctPage(const Query &query) const;
+    Sql anchored(const StoredOrder &order, const Query &query) const;
     std::int64_t countOutside(const std::string &prefix, std::int64_t bound);
-    void addSongs(Sql &sql, bool isWalk = false);
+    void addSongs(Sql &sql, bool isWalk = false) const;
 
     Reader &reader_;
     std::vector<Conjunct> conjuncts_;

@@ -103,21 +103,21 @@ std::optional<Result> Reader::beginSnapshot(const Statement &statement) {
     return takeState(results[1]) ? std::nullopt : std::optional(std::move(results[2]));
 }
 
-/* A role may have been given its rights before there was the table: then nothing is known. */
-const GramSet &Reader::gramsOf(Column column) {
+/* A role may have been given its rights before there was the table. */
+const GramShares &Reader::gramsOf(Column column) {
     if (const auto known = grams_.find(column); known != grams_.end()) {
         return known->second;
     }
     if (isInSnapshot_) {  // which a refusal would end
-        static const GramSet kNone;
+        static const GramShares kNone;
         return kNone;
     }
-    GramSet grams;
+    GramShares grams;
     try {
-        Sql sql = newSql("SELECT common FROM grams WHERE key=");
+        Sql sql = newSql("SELECT shares FROM grams WHERE key=");
         const Result rows = connection_.run(sql.bind(std::string(columnInfo(column).key)));
         if (rows.size() > 0) {
-            grams = GramSet(std::string(rows[0].text(0)));
+            grams = GramShares(std::string(rows[0].text(0)));
         }
     } catch (const ServerError &error) {
         if (error.state() != kNoRight) {
@@ -125,20 +125,6 @@ const GramSet &Reader::gramsOf(Column column) {
         }
     }
     return grams_.emplace(column, std::move(grams)).first->second;
-}
-
-bool Reader::isRare(const SearchTerm &term) {
-    const auto &pieces = term.pattern.pieces();
-    return std::any_of(pieces.begin(), pieces.end(), [&](const Pattern::Piece &piece) {
-        return piece.kind == Pattern::Piece::Kind::Literal && hasTrigram(piece.text) &&
-               gramsOf(term.column).isKnown() &&
-               !gramsOf(term.column).hasEveryTrigramOf(piece.text);
-    });
-}
-
-bool Reader::isFrequent(const SearchTerm &term) {
-    const std::size_t gram = gramNumber(term.pattern.part().value_or(""));
-    return gram != 0 && gramsOf(term.column).has(gram);
 }
 
 /* Nearly always true of the music root. What all paths begin with is what the first and the last

@@ -54,20 +54,18 @@ class Reader {
     const State &state();
     /* Whether the path of every song begins so. */
     bool allPathsBegin(const std::string &prefix);
-    /* Whether no more than a few songs can be among the results of a search; whether many are. */
-    bool isRare(const SearchTerm &term);
-    bool isFrequent(const SearchTerm &term);
+    /* What is known of the key of a column. */
+    const GramShares &gramsOf(Column column);
 
   private:
     bool takeState(const Result &rows);
-    const GramSet &gramsOf(Column column);
 
     Connection connection_;
     std::optional<State> state_;
     bool isInSnapshot_ = false;
     /* Of the songs at that generation. */
     std::optional<std::string> commonPrefix_;
-    std::map<Column, GramSet> grams_;
+    std::map<Column, GramShares> grams_;
 };
 
 class ReaderPool : public std::enable_shared_from_this<ReaderPool> {

@@ -55,6 +55,11 @@ CREATE FUNCTION zano.zano_text(bytea) RETURNS text LANGUAGE plpgsql IMMUTABLE ST
                                                                   R"sql(
 CREATE TABLE zano.grams(key text PRIMARY KEY, common bytea NOT NULL);
 UPDATE zano.state SET value=-1 WHERE name='anchored';
+)sql",
+                                                                  R"sql(
+ALTER TABLE zano.grams RENAME COLUMN common TO shares;
+DELETE FROM zano.grams;
+UPDATE zano.state SET value=-1 WHERE name='anchored';
 )sql"};
 
 /* Any number that all programs of this kind use to take turns. */
@@ -111,16 +116,13 @@ void addSearchIndex(Connection &connection) {
  * are sorted while they are read. */
 struct IndexRow {
     const char *name;
-    const char *leading;
-    const char *rest;
+    Column leading;
+    std::size_t columns;
 };
 constexpr std::array kIndexes = {
-    IndexRow{"title", "title_key", "album_key, disc, track"},
-    IndexRow{"album", "album_key", "disc, track, title_key"},
-    IndexRow{"artist", "artist_key", "album_key, disc, track, title_key"},
-    IndexRow{"genre", "genre_key", "album_key, disc, track, title_key"},
-    IndexRow{"year", "year", "album_key, disc, track, title_key"},
-    IndexRow{"duration", "duration", "album_key, disc, track, title_key"},
+    IndexRow{"title", Column::Title, 4},   IndexRow{"album", Column::Album, 4},
+    IndexRow{"artist", Column::Artist, 5}, IndexRow{"genre", Column::Genre, 5},
+    IndexRow{"year", Column::Year, 5},     IndexRow{"duration", Column::Duration, 5},
 };
 
 void migrate(Connection &connection) {
@@ -192,8 +194,12 @@ void addIndexes(Connection &connection, const std::function<void()> &onStep) {
     for (const IndexRow &index : kIndexes) {
         for (const bool descending : {false, true}) {
             std::string sql = "CREATE INDEX IF NOT EXISTS songs_by_";
-            sql.append(index.name).append(descending ? "_down ON songs(" : " ON songs(");
-            sql.append(index.leading).append(descending ? " DESC, " : ", ").append(index.rest);
+            sql.append(index.name).append(descending ? "_down ON songs" : " ON songs");
+            std::string_view separator = "(";
+            for (const std::string_view column : indexedColumns(index.leading)) {
+                sql.append(separator).append(column);
+                separator = descending && separator == "(" ? " DESC, " : ", ";
+            }
             connection.run(sql + ")");
             onStep();
         }
@@ -232,6 +238,18 @@ std::vector<std::string_view> tailColumns(Column leading) {
                 columns.push_back(orderColumn(term.column));
             }
         }
+    }
+    return columns;
+}
+
+std::vector<std::string_view> indexedColumns(Column leading) {
+    const auto index = std::find_if(kIndexes.begin(), kIndexes.end(),
+                                    [leading](const auto &row) { return row.leading == leading; });
+    std::vector<std::string_view> columns;
+    if (index != kIndexes.end()) {
+        columns = tailColumns(leading);
+        columns.insert(columns.begin(), orderColumn(leading));
+        columns.resize(index->columns);
     }
     return columns;
 }

@@ -11,7 +11,7 @@
 
 namespace zano::mediadb::postgresql {
 
-constexpr std::int64_t kSchemaVersion = 2;
+constexpr std::int64_t kSchemaVersion = 3;
 
 /* Several programs write at once, perhaps the same songs and always the same counts. So that they
  * never wait for each other in a circle, a batch is written in one go, under a lock on this row,
@@ -43,6 +43,9 @@ struct StoredOrder {
 };
 const std::vector<StoredOrder> &storedOrders();
 const StoredOrder *findStoredOrder(const OrderTerm &leading);
+
+/* The columns of the index of an order, which are its first; none where that is not to be had. */
+std::vector<std::string_view> indexedColumns(Column leading);
 
 /* The columns that decide between songs whose leading column is equal; none for id and path. */
 std::vector<std::string_view> tailColumns(Column leading);

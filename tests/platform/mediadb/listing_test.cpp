@@ -123,6 +123,9 @@ class ListingTest : public EngineTest {
              [&](const Song &song) {
                  return has(song.title, "a") && song.path.substr(0, 9) == "/music/3/";
              }},
+            {"title ilike '%AB%'", [&](const Song &song) { return has(song.title, "ab"); }},
+            {"artist ilike '%\u0440\u0423\u041F%'",
+             [&](const Song &song) { return has(song.artist, "\u0440\u0443\u043F"); }},
             {"title ilike '%p_a%'", [&](const Song &song) { return has(song.title, "pha"); }},
             {"(title ilike '%ab%' or artist ilike '%ab%' or album ilike '%ab%')",
              [&](const Song &song) { return has(song.title, "ab") || has(song.artist, "ab"); }},
