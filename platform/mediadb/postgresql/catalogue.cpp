@@ -33,7 +33,7 @@ constexpr double kSongsSampled = 50000;
  * an order finds a page of 50 of them after 50 * all / n entries, and a row takes about as long as
  * eight of those: both are alike where n * n is this times all. */
 constexpr double kEvenSquare = 6.5;
-constexpr std::int64_t kFewSongs = 200;
+constexpr std::int64_t kFewSongs = 100;
 /* The entries of a page with more songs than these between are looked at before their rows. */
 constexpr std::int64_t kManyShare = 16;
 constexpr std::array kSearched = {Column::Title, Column::Artist, Column::Album, Column::Genre};

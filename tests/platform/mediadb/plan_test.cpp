@@ -169,13 +169,13 @@ TEST_F(PostgresqlPlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
         EXPECT_EQ(frequent.find("Kept"), 0U) << frequent;
         EXPECT_NE(frequent.find(" using songs_"), std::string::npos) << order << "\n" << frequent;
         if (order.find("id") != 0 && order.find("path") != 0) {
-            const std::string two = planOf("title ilike '%jq%'", order, query);
-            EXPECT_NE(two.find("Index Only Scan using songs_by_"), std::string::npos)
-                << order << "\n"
-                << two;
+            /* 159 titles. */
+            const std::string some = planOf("title ilike '%12%'", order, query);
+            EXPECT_EQ(some.find("Kept"), 0U) << some;
+            EXPECT_NE(some.find("Index Only Scan using songs_by_"), std::string::npos)
+                << order << some;
             const std::string unknown = planOf("title ilike '%\u0434\u043E\u043C%'", order, query);
             EXPECT_NE(unknown.find("Bitmap Index Scan on songs_grams"), std::string::npos)
-                << order << "\n"
                 << unknown;
         }
     }
