@@ -1,7 +1,5 @@
 #include "support/http_server.h"
 
-#include <arpa/inet.h>
-#include <netinet/in.h>
 #include <poll.h>
 #include <sys/eventfd.h>
 #include <sys/socket.h>
@@ -10,6 +8,8 @@
 #include <algorithm>
 #include <cstdlib>
 #include <stdexcept>
+
+#include "support/loopback.h"
 
 namespace http_server {
 
@@ -20,10 +20,6 @@ size_t bodyLength(const std::string &header) {
     constexpr const char *kName = "\r\nContent-Length: ";
     const size_t place = header.find(kName);
     return place == std::string::npos ? 0 : std::strtoul(header.c_str() + place + 18, nullptr, 10);
-}
-
-sockaddr *general(sockaddr_in &address) {
-    return reinterpret_cast<sockaddr *>(&address);
 }
 
 }  // namespace
@@ -37,15 +33,10 @@ Server::Server(std::function<Reply(const std::string &)> script)
     : script_(std::move(script)),
       listener_(socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0)),
       stop_(eventfd(0, EFD_CLOEXEC)) {
-    sockaddr_in address{};
-    address.sin_family = AF_INET;
-    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    socklen_t size = sizeof address;
-    if (bind(listener_, general(address), size) != 0 || listen(listener_, 16) != 0 ||
-        getsockname(listener_, general(address), &size) != 0) {
+    port_ = loopback::bindToFreePort(listener_);
+    if (listen(listener_, 16) != 0) {
         throw std::runtime_error("no server on the loopback interface");
     }
-    port_ = ntohs(address.sin_port);
     thread_ = std::thread([this] { serve(); });
 }
 

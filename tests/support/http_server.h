@@ -55,7 +55,7 @@ class Server {
     std::function<Reply(const std::string &)> script_;
     int listener_;
     int stop_;
-    unsigned short port_ = 0;
+    int port_ = 0;
     std::atomic<unsigned long> sent_ = 0;
     mutable std::mutex mutex_;
     std::vector<std::string> requests_;

@@ -28,4 +28,13 @@ inline std::string textOf(const Json::Value &value) {
     return Json::writeString(writer, value);
 }
 
+/* The titles of songs or of entries of a playlist, one behind the other. */
+inline std::string titlesOf(const Json::Value &songs) {
+    std::string titles;
+    for (const Json::Value &song : songs) {
+        titles += song["title"].asString();
+    }
+    return titles;
+}
+
 }  // namespace json

@@ -1,6 +1,5 @@
 #include "support/program.h"
 
-#include <arpa/inet.h>
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
@@ -17,6 +16,8 @@
 #include <utility>
 
 #include <linux/capability.h>
+
+#include "support/loopback.h"
 
 namespace program {
 namespace {
@@ -130,14 +131,9 @@ int inputOf(const std::string &text) {
 
 int freePort() {
     const int file = socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
-    sockaddr_in address{};
-    address.sin_family = AF_INET;
-    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    socklen_t size = sizeof address;
-    auto *const general = reinterpret_cast<sockaddr *>(&address);
-    EXPECT_EQ(bind(file, general, size) | getsockname(file, general, &size), 0);
+    const int port = loopback::bindToFreePort(file);
     close(file);
-    return ntohs(address.sin_port);
+    return port;
 }
 
 Process::Process(const Start &start) : haveErrorsAnEnd_(start.errors != Stream::Kept) {

@@ -7,7 +7,7 @@ namespace command_line {
 namespace {
 
 program::Start startOf(const Invocation &invocation) {
-    std::vector<std::string> words = {"vorelix"};
+    Words words = {"vorelix"};
     words.insert(words.end(), invocation.arguments.begin(), invocation.arguments.end());
     return {.path = VORELIX_PROGRAM,
             .argv = words,
@@ -30,7 +30,7 @@ pid_t start(const Invocation &invocation) {
     return program::Process(silent).release();
 }
 
-CommandLine::CommandLine() {
+CommandLine::CommandLine(Words front) : front_(std::move(front)) {
     files::write(ZANO_PATH_CONF, "mediadb=\"" + location_ + "\"\n");
 }
 
@@ -44,11 +44,39 @@ void CommandLine::fill(const std::vector<zano::mediadb::Song> &songs) const {
     catalogue->finish({});
 }
 
-Json::Value CommandLine::answerOf(std::vector<std::string> arguments) {
-    arguments.emplace_back("--json");
-    const Ended ended = run({arguments});
+void CommandLine::fillWithLetters(int count, const std::filesystem::path &folder) const {
+    std::vector<zano::mediadb::Song> songs(static_cast<size_t>(count));
+    for (size_t i = 0; i < songs.size(); ++i) {
+        songs[i].title = std::string(1, static_cast<char>('a' + i));
+        songs[i].path = folder / (songs[i].title + ".mp3");
+    }
+    fill(songs);
+}
+
+Words CommandLine::whole(const Words &words) const {
+    Words all = front_;
+    all.insert(all.end(), words.begin(), words.end());
+    return all;
+}
+
+std::string CommandLine::says(const Words &words, const std::string &input) const {
+    const Ended ended = run({.arguments = whole(words), .input = input});
     EXPECT_EQ(ended.err, "");
-    return json::parsed(ended.out);
+    EXPECT_EQ(ended.status, 0);
+    return ended.out;
+}
+
+std::string CommandLine::fails(const Words &words, int status, unsigned long fileSizeLimit) const {
+    const Ended ended = run({.arguments = whole(words), .fileSizeLimit = fileSizeLimit});
+    EXPECT_EQ(ended.status, status) << ended.err;
+    EXPECT_EQ(ended.out, "");
+    EXPECT_TRUE(ended.err.starts_with("vorelix: ")) << ended.err;
+    return ended.err;
+}
+
+Json::Value CommandLine::answerOf(Words words) const {
+    words.emplace_back("--json");
+    return json::parsed(says(words));
 }
 
 }  // namespace command_line

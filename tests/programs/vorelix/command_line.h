@@ -16,16 +16,19 @@
 #include "platform/mediadb/cluster.h"
 #include "support/files.h"
 #include "support/program.h"
+#include "support/text.h"
 #include "system_paths_internal.h"
 
 namespace command_line {
 
 using program::Ended;
 using program::statusOf;
+using text::contains;
 using Output = program::Stream;
+using Words = std::vector<std::string>;
 
 struct Invocation {
-    std::vector<std::string> arguments;
+    Words arguments;
     std::map<std::string, std::string> environment = {};  // nothing else is set
     Output output = Output::Kept;
     unsigned short columns = 0;  // of the terminal
@@ -41,15 +44,25 @@ pid_t start(const Invocation &invocation);
 /* Each test starts without a database and with a setting that names where it would be. */
 class CommandLine : public testing::Test {
   protected:
-    CommandLine();
+    /* The words stand in front of all that says(), fails() and answerOf() are told. */
+    explicit CommandLine(Words front = {});
 
     /* Makes the database with these songs; their ids count from 1. */
     void fill(const std::vector<zano::mediadb::Song> &songs) const;
+    /* With so many songs a, b, ... whose files would be in the folder. */
+    void fillWithLetters(int count, const std::filesystem::path &folder) const;
 
+    /* What is printed on standard output; the command has to succeed. */
+    std::string says(const Words &words, const std::string &input = "") const;
+    /* The error of a command that has to fail, and answers nothing. */
+    std::string fails(const Words &words, int status = 1, unsigned long fileSizeLimit = 0) const;
     /* Runs with --json and gives the document; fails the test when there is none. */
-    static Json::Value answerOf(std::vector<std::string> arguments);
+    Json::Value answerOf(Words words) const;
 
   private:
+    Words whole(const Words &words) const;
+
+    const Words front_;
     const files::Places places_{ZANO_PATH_CONF};
     files::Folder temporary_;
 

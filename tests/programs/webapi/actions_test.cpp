@@ -1,8 +1,8 @@
 #include <cstring>
-#include <thread>
 
 #include "support/json.h"
 #include "support/process.h"
+#include "support/text.h"
 #include "system_paths_internal.h"
 #include "web_server.h"
 
@@ -10,14 +10,8 @@ namespace web_test {
 namespace {
 
 using json::textOf;
-
-std::string titlesOf(const Json::Value &songs) {
-    std::string titles;
-    for (const Json::Value &song : songs) {
-        titles += song["title"].asString();
-    }
-    return titles;
-}
+using json::titlesOf;
+using text::contains;
 
 /* What the program prints, started as a server does. */
 std::string printed(const std::string &environment, const std::string &body = "") {
@@ -136,15 +130,13 @@ TEST_F(Front, PlaylistsThatCannotBeEdited) {
     std::filesystem::remove(lists / "out.m3u");
     files::write(path("secret.m3u"), "#EXTM3U\nhttp://secret.example/\n");
     std::filesystem::create_symlink(path("secret.m3u"), lists / "out.m3u");
-    EXPECT_EQ(ask({.query = "action=playlist&id=2"}).outcome(), "404 file");
-    EXPECT_EQ(ask({.query = "action=playlist-append", .form = "id=2&songs=1"}).outcome(),
-              "404 file");
-    EXPECT_EQ(ask({.query = "action=playlist&id=3"}).outcome(), "404 file");
-    EXPECT_EQ(ask({.query = "action=playlist-append", .form = "id=3&songs=1"}).outcome(),
-              "404 file");
-    EXPECT_EQ(files::read(path("secret.m3u")), "#EXTM3U\nhttp://secret.example/\n");
-    post("action=playlist-delete", "id=2");
-    post("action=playlist-delete", "id=3");
+    for (const std::string id : {"id=2", "id=3"}) {
+        EXPECT_EQ(ask({.query = "action=playlist&" + id}).outcome(), "404 file");
+        EXPECT_EQ(ask({.query = "action=playlist-append", .form = id + "&songs=1"}).outcome(),
+                  "404 file");
+        EXPECT_EQ(files::read(path("secret.m3u")), "#EXTM3U\nhttp://secret.example/\n");
+        post("action=playlist-delete", id);
+    }
     EXPECT_EQ(files::read(path("secret.m3u")), "#EXTM3U\nhttp://secret.example/\n");
     files::write(lists / "read.m3u", "#EXTM3U\nhttp://x.example/y\n#EXTINF:3,T\n/z/T.mp3\n");
     const Json::Value entries = get("action=playlist&id=1")["entries"];
@@ -156,24 +148,17 @@ TEST_F(Front, PlaylistsThatCannotBeEdited) {
 TEST_F(Front, EditsAtOnceLoseNothing) {
     serveDevice();
     post("action=playlist-create", "title=all");
-    std::vector<std::thread> callers;
-    for (int caller = 0; caller < 4; ++caller) {
-        callers.emplace_back([this, caller] {
-            for (int i = 0; i < 5; ++i) {
-                const std::string song = std::to_string(caller % 3 + 1);
-                const std::string outcome =
-                    ask({.query = "action=playlist-append", .form = "id=1&songs=" + song})
-                        .outcome();
-                EXPECT_TRUE(outcome == "200" || outcome == "409 busy") << outcome;
-                if (outcome != "200") {
-                    --i;
-                }
+    process::runAtOnce(4, [this](int caller) {
+        const std::string form = "id=1&songs=" + std::to_string(caller % 3 + 1);
+        for (int made = 0; made < 5;) {
+            const Answer answer = ask({.query = "action=playlist-append", .form = form});
+            if (answer.outcome() != "200" && answer.outcome() != "409 busy") {
+                return 1;
             }
-        });
-    }
-    for (std::thread &caller : callers) {
-        caller.join();
-    }
+            made += answer.status == 200 ? 1 : 0;
+        }
+        return 0;
+    });
     const std::string entries = entriesOf(1);
     EXPECT_EQ(entries.size(), 20U);
     EXPECT_EQ(std::count(entries.begin(), entries.end(), 'a'), 10);
@@ -251,16 +236,16 @@ TEST_F(Front, ProgramWithoutItsServer) {
     for (const auto &row : cases) {
         const std::string text = printed(row.environment, row.body);
         EXPECT_EQ(text.substr(0, strlen(row.status)), row.status) << row.environment;
-        EXPECT_NE(text.find("{"), std::string::npos) << row.environment;
+        EXPECT_TRUE(contains(text, "{")) << row.environment;
     }
 }
 
 /* What the other parts of both libraries need costs each request its loading. */
 TEST(Program, LoadsNothingForWhatItDoesNotDo) {
     const std::string libraries = printed("LD_TRACE_LOADED_OBJECTS=1");
-    EXPECT_NE(libraries.find("libsqlite3"), std::string::npos) << libraries;
+    EXPECT_TRUE(contains(libraries, "libsqlite3"));
     for (const char *library : {"libpq", "libcurl", "libxml2"}) {
-        EXPECT_EQ(libraries.find(library), std::string::npos) << libraries;
+        EXPECT_FALSE(contains(libraries, library)) << libraries;
     }
 }
 

@@ -52,7 +52,6 @@ TEST_F(Streams, AreWholeOrTheRangeThatIsWanted) {
     } cases[] = {
         {song, "Range: bytes=5-7", 206, "bytes 5-7/40", "567"},
         {song, "Range: bytes=-2", 206, "bytes 38-39/40", "89"},
-        {song, "Range: bytes=38-99", 206, "bytes 38-39/40", "89"},
         {song, "Range: bytes=x", 200, "", kBytes},
         {song, soon, 200, "", kBytes},
         {song, "Range: bytes=5-7\r\nIf-Range: " + whole.headers.at("etag"), 206, "bytes 5-7/40",

@@ -1,7 +1,5 @@
 #include "web_server.h"
 
-#include <arpa/inet.h>
-#include <netinet/in.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -12,6 +10,7 @@
 
 #include "mediadb/catalogue.h"
 #include "support/json.h"
+#include "support/loopback.h"
 #include "system_paths_internal.h"
 
 namespace web_test {
@@ -21,14 +20,6 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr const char *kPasswordHash = "{SHA}EfatjsUqKYSrqv18O1FlA3hcIHI=";
-
-sockaddr_in loopback(int port) {
-    sockaddr_in address{};
-    address.sin_family = AF_INET;
-    address.sin_port = htons(static_cast<uint16_t>(port));
-    address.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-    return address;
-}
 
 std::string decodedChunks(const std::string &body) {
     std::string text;
@@ -184,8 +175,8 @@ int Front::connectToServer() const {
     const int socket = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
     const timeval limit{120, 0};
     setsockopt(socket, SOL_SOCKET, SO_RCVTIMEO, &limit, sizeof limit);
-    const sockaddr_in address = loopback(port_);
-    if (connect(socket, reinterpret_cast<const sockaddr *>(&address), sizeof address) != 0) {
+    sockaddr_in address = loopback::address(port_);
+    if (connect(socket, loopback::general(address), sizeof address) != 0) {
         close(socket);
         return -1;
     }
@@ -244,12 +235,8 @@ Json::Value Front::post(const std::string &query, const std::string &form) const
 }
 
 std::string Front::entriesOf(int playlist) const {
-    std::string titles;
-    const Json::Value answer = get("action=playlist&limit=500&id=" + std::to_string(playlist));
-    for (const Json::Value &entry : answer["entries"]) {
-        titles += entry["title"].asString();
-    }
-    return titles;
+    return ::json::titlesOf(
+        get("action=playlist&limit=500&id=" + std::to_string(playlist))["entries"]);
 }
 
 }  // namespace web_test

@@ -5,8 +5,6 @@
 namespace zano::index {
 namespace {
 
-using Lines = std::vector<std::string>;
-
 class DeleteTest : public IndexTest {
   protected:
     void SetUp() override {
@@ -55,7 +53,7 @@ TEST_F(DeleteTest, AsTheLibraryStartsIt) {
     files::write(ZANO_PATH_CONF, "mediadb=\"sqlite:" + music() + "\"\n");
     const auto ended = Process({ZANOINDEX_PROGRAM, {"-d", "/nowhere"}}).wait();
     EXPECT_EQ(ended.status, 1) << "a failure is told";
-    EXPECT_NE(ended.err.find(music()), std::string::npos) << ended.err;
+    EXPECT_TRUE(contains(ended.err, music()));
 }
 
 }  // namespace

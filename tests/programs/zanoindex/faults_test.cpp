@@ -11,8 +11,6 @@
 namespace zano::index {
 namespace {
 
-using Lines = std::vector<std::string>;
-
 /* What a run does to folders, seen from outside. */
 class Observer {
   public:
@@ -128,7 +126,7 @@ TEST_F(FaultsTest, FilesThatStopTheReaderCostThemselvesOnly) {
     // Not read again, but named again; the one that only waited is read again.
     const auto again = runFaulty({"-j2", "--json", music()});
     const auto summary = parsed(again.out);
-    EXPECT_EQ(counts(summary), "added 0, updated 0, unchanged 16, removed 0, kept 0, failed 8");
+    EXPECT_EQ(counts(summary), "unchanged 16, failed 8");
     for (const auto &failed : summary["failed"]) {
         const auto reason = failed["reason"].asString();
         const bool isStall = failed["path"].asString().ends_with("/stall.mp3");
@@ -224,7 +222,7 @@ TEST_F(FaultsTest, CtrlCEndsCleanly) {
         kill(process->pid(), signal);
         const auto ended = process->wait();
         EXPECT_EQ(ended.status, 128 + signal) << ended.err;
-        EXPECT_NE(ended.err.find("stopped"), std::string::npos) << ended.err;
+        EXPECT_TRUE(contains(ended.err, "stopped"));
         const auto summary = parsed(ended.out);
         EXPECT_TRUE(summary["stopped"].asBool());
         EXPECT_EQ(summary["added"].asUInt(), paths().size());
@@ -249,8 +247,8 @@ TEST_F(FaultsTest, BarOnATerminal) {
     add("a.mp3");
     add("stall.mp3");
     const auto ended = startFaulty({music()}, program::Stream::Terminal)->wait();
-    EXPECT_NE(ended.err.find("\r\033[K["), std::string::npos) << ended.err;
-    EXPECT_NE(ended.err.find("reading tags: 1 of 2 files"), std::string::npos) << ended.err;
+    EXPECT_TRUE(contains(ended.err, "\r\033[K["));
+    EXPECT_TRUE(contains(ended.err, "reading tags: 1 of 2 files"));
     EXPECT_TRUE(ended.out.starts_with("2 files in ")) << ended.out;
 }
 

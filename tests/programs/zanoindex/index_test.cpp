@@ -35,6 +35,12 @@ Ended IndexTest::run(const std::vector<std::string> &arguments) const {
     return Process({ZANOINDEX_PROGRAM, argumentsOf(arguments)}).wait();
 }
 
+std::string IndexTest::failsAt(const std::vector<std::string> &arguments) const {
+    const auto ended = run(arguments);
+    EXPECT_EQ(ended.status, 1) << ended.err;
+    return ended.err;
+}
+
 Ended IndexTest::runFaulty(const std::vector<std::string> &arguments) const {
     return Process({ZANOINDEX_FAULTY, argumentsOf(arguments)}).wait();
 }
@@ -103,10 +109,14 @@ std::vector<std::string> IndexTest::sounds() const {
 
 std::string counts(const Json::Value &summary) {
     std::string text;
-    for (const char *name : {"added", "updated", "unchanged", "removed", "kept"}) {
-        text += std::string(name) + " " + summary[name].asString() + ", ";
+    for (const char *name : {"added", "updated", "unchanged", "removed", "kept", "failed"}) {
+        const Json::Value &value = summary[name];
+        const unsigned count = value.isArray() ? value.size() : value.asUInt();
+        if (count > 0) {
+            text += (text.empty() ? "" : ", ") + std::string(name) + " " + std::to_string(count);
+        }
     }
-    return text + "failed " + std::to_string(summary["failed"].size());
+    return text;
 }
 
 }  // namespace zano::index

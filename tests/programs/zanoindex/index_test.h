@@ -15,6 +15,7 @@
 #include "support/files.h"
 #include "support/json.h"
 #include "support/program.h"
+#include "support/text.h"
 
 namespace zano::index {
 
@@ -23,6 +24,8 @@ namespace fs = std::filesystem;
 using json::parsed;
 using program::Ended;
 using program::Process;
+using text::contains;
+using Lines = std::vector<std::string>;
 
 class IndexTest : public testing::Test, protected files::Folder {
   protected:
@@ -41,6 +44,8 @@ class IndexTest : public testing::Test, protected files::Folder {
     /* The arguments with the database's in front. */
     std::vector<std::string> argumentsOf(const std::vector<std::string> &arguments) const;
     Ended run(const std::vector<std::string> &arguments) const;
+    /* What a run says that has to fail. */
+    std::string failsAt(const std::vector<std::string> &arguments) const;
     Ended runFaulty(const std::vector<std::string> &arguments) const;
     /* Runs with --json and gives the summary; the exit code must be the expected one. */
     Json::Value summaryOf(std::vector<std::string> arguments, int status = 0) const;
@@ -64,7 +69,7 @@ class IndexTest : public testing::Test, protected files::Folder {
     std::string location_;
 };
 
-/* "added 1, updated 0, unchanged 3, removed 0, kept 0, failed 0" */
+/* "added 1, unchanged 3": what there is of added, updated, unchanged, removed, kept, failed. */
 std::string counts(const Json::Value &summary);
 
 }  // namespace zano::index

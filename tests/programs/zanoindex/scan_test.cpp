@@ -6,8 +6,6 @@
 namespace zano::index {
 namespace {
 
-using Lines = std::vector<std::string>;
-
 class ScanTest : public IndexTest {
   protected:
     /* The bytes of all files of the database. */
@@ -26,18 +24,6 @@ class ScanTest : public IndexTest {
     }
 };
 
-TEST_F(ScanTest, SecondRunTouchesNothing) {
-    addMany("a", 5);
-    add("b/.hidden.mp3");
-    files::write(music() + "/b/notes.txt", "no music");
-    EXPECT_EQ(counts(summaryOf({music()})),
-              "added 5, updated 0, unchanged 0, removed 0, kept 0, failed 0");
-    const auto before = databaseContent();
-    EXPECT_EQ(counts(summaryOf({music()})),
-              "added 0, updated 0, unchanged 5, removed 0, kept 0, failed 0");
-    EXPECT_EQ(databaseContent(), before);
-}
-
 TEST_F(ScanTest, ChangedFilesAreReadAgain) {
     addMany("a", 4);
     run({music()});
@@ -55,10 +41,8 @@ TEST_F(ScanTest, ChangedFilesAreReadAgain) {
     const auto kept = fs::last_write_time(path);
     files::write(path, content.replace(at, 6, "Album2"));
     fs::last_write_time(path, kept);
-    EXPECT_EQ(counts(summaryOf({music()})),
-              "added 0, updated 1, unchanged 3, removed 0, kept 0, failed 0");
-    EXPECT_EQ(counts(summaryOf({"--reread", music()})),
-              "added 0, updated 4, unchanged 0, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summaryOf({music()})), "updated 1, unchanged 3");
+    EXPECT_EQ(counts(summaryOf({"--reread", music()})), "updated 4");
     EXPECT_EQ(paths().size(), 4U);
 }
 
@@ -69,13 +53,11 @@ TEST_F(ScanTest, RowsOfVanishedFilesGo) {
     fs::remove(music() + "/a/0.ogg");
     fs::rename(music() + "/b", music() + "/c");
     // half of them is not more than half
-    EXPECT_EQ(counts(summaryOf({music()})),
-              "added 1, updated 0, unchanged 2, removed 2, kept 0, failed 0");
+    EXPECT_EQ(counts(summaryOf({music()})), "added 1, unchanged 2, removed 2");
     EXPECT_EQ(paths().back(), "c/x.mp3");
     // other folders than the scanned one are left alone
     fs::remove(music() + "/c/x.mp3");
-    EXPECT_EQ(counts(summaryOf({music() + "/a"})),
-              "added 0, updated 0, unchanged 2, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summaryOf({music() + "/a"})), "unchanged 2");
     EXPECT_EQ(paths().size(), 3U);
 }
 
@@ -102,10 +84,9 @@ TEST_F(ScanTest, FolderThatLostItsSongsKeepsItsRows) {
         }
         fs::remove(music() + "/other/0.ogg");
 
-        const auto ended = run({folder, music() + "/other"});
-        EXPECT_EQ(ended.status, 1);
-        EXPECT_NE(ended.err.find(folder + ": " + reason), std::string::npos) << ended.err;
-        EXPECT_NE(ended.err.find("--prune"), std::string::npos);
+        const auto error = failsAt({folder, music() + "/other"});
+        EXPECT_TRUE(contains(error, folder + ": " + reason));
+        EXPECT_TRUE(contains(error, "--prune"));
         EXPECT_EQ(paths().size(), 6U) << "the other folder was cleaned up";
 
         const auto summary = summaryOf({"--prune", folder});
@@ -119,6 +100,8 @@ TEST_F(ScanTest, FolderThatLostItsSongsKeepsItsRows) {
 
 TEST_F(ScanTest, PlaylistsAreListedWhileTheirFilesAreThere) {
     addMany("a", 3);
+    add("a/.hidden.mp3");
+    files::write(music() + "/a/notes.txt", "no music");
     fs::create_directories(music() + "/playlists");
     fs::create_directories(music() + "/b");
     for (const char *name : {"a/x.m3u", "playlists/S\u00F6mmer.M3U8", "playlists/caf\xE9.pls",
@@ -134,8 +117,10 @@ TEST_F(ScanTest, PlaylistsAreListedWhileTheirFilesAreThere) {
     EXPECT_EQ(summary["files"], 3);
     EXPECT_EQ(playlists(), all);
     const auto before = databaseContent();
-    EXPECT_EQ(summaryOf({music()})["playlistsAdded"], 0);
-    EXPECT_EQ(databaseContent(), before);
+    summary = summaryOf({music()});
+    EXPECT_EQ(counts(summary), "unchanged 3");
+    EXPECT_EQ(summary["playlistsAdded"], 0);
+    EXPECT_EQ(databaseContent(), before) << "a second run touches nothing";
 
     fs::rename(music() + "/playlists/link.m3u", music() + "/a/link.pls");
     summary = summaryOf({music() + "/a", music() + "/playlists"});
@@ -149,12 +134,6 @@ TEST_F(ScanTest, PlaylistsAreListedWhileTheirFilesAreThere) {
     EXPECT_EQ(summaryOf({music() + "/a"}, 1)["playlistsRemoved"], 0);
     EXPECT_EQ(summaryOf({"--prune", music()})["playlistsRemoved"], 3);
     EXPECT_EQ(playlists().size(), 2U);
-}
-
-TEST_F(ScanTest, FolderThatWasNeverThere) {
-    const auto ended = run({music() + "/nowhere"});
-    EXPECT_EQ(ended.status, 1);
-    EXPECT_NE(ended.err.find("/nowhere: No such file or directory"), std::string::npos);
 }
 
 TEST_F(ScanTest, SongsBelowUnreadableFoldersAreKept) {
@@ -172,10 +151,8 @@ TEST_F(ScanTest, SongsBelowUnreadableFoldersAreKept) {
     chmod(shut.c_str(), 0700);
     chmod(listed.c_str(), 0700);
     EXPECT_EQ(ended.status, 1) << ended.err;
-    EXPECT_EQ(counts(parsed(ended.out)),
-              "added 0, updated 0, unchanged 3, removed 0, kept 4, failed 0");
-    EXPECT_NE(ended.err.find(shut + ": cannot be looked at: Permission denied"), std::string::npos)
-        << ended.err;
+    EXPECT_EQ(counts(parsed(ended.out)), "unchanged 3, kept 4");
+    EXPECT_TRUE(contains(ended.err, shut + ": cannot be looked at: Permission denied"));
     EXPECT_EQ(paths().size(), 7U);
 }
 
@@ -204,17 +181,14 @@ TEST_F(ScanTest, AnyNameIsIndexedAndOpensAgain) {
     for (const auto &name : listed) {
         EXPECT_TRUE(fs::exists(music() + "/" + name)) << name;
     }
-    EXPECT_EQ(counts(summaryOf({music()})),
-              "added 0, updated 0, unchanged 16, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summaryOf({music()})), "unchanged 16");
 }
 
 TEST_F(ScanTest, NamesInMessagesAndJson) {
     const auto path = music() + "/\x1B[2J\xFF\n.mp3";
     files::write(path, "not music");
     const auto ended = run({"--json", music()});
-    EXPECT_NE(ended.err.find(music() + "/\\x1B[2J\\xFF\\n.mp3: not an audio file\n"),
-              std::string::npos)
-        << ended.err;
+    EXPECT_TRUE(contains(ended.err, music() + "/\\x1B[2J\\xFF\\n.mp3: not an audio file\n"));
     const auto failed = parsed(ended.out)["failed"][0];
     EXPECT_TRUE(failed["pathBytes"].asString().ends_with("/%1B[2J%FF%0A.mp3"));
 }
@@ -231,10 +205,8 @@ TEST_F(ScanTest, LinksAndSpecialFiles) {
     const auto ended = run({music()});
     EXPECT_EQ(ended.status, 0);
     EXPECT_EQ(paths(), (Lines{"folder.mp3/y.mp3", "link.mp3", "real/x.mp3"}));
-    EXPECT_NE(ended.err.find("1 links to folders were not followed, the first is " + music() +
-                             "/real/loop"),
-              std::string::npos)
-        << ended.err;
+    EXPECT_TRUE(contains(
+        ended.err, "1 links to folders were not followed, the first is " + music() + "/real/loop"));
 }
 
 TEST_F(ScanTest, PathsThatAreTooLong) {
@@ -251,8 +223,7 @@ TEST_F(ScanTest, PathsThatAreTooLong) {
     fs::current_path(home);
     const auto summary = summaryOf({music()}, 1);
     EXPECT_EQ(paths(), Lines{"x.mp3"});
-    EXPECT_NE(summary["folders"][0]["reason"].asString().find("File name too long"),
-              std::string::npos);
+    EXPECT_TRUE(contains(summary["folders"][0]["reason"].asString(), "File name too long"));
 }
 
 TEST_F(ScanTest, FoldersAreGivenInAnyForm) {
@@ -303,7 +274,7 @@ TEST_F(ScanTest, Usage) {
         EXPECT_NE(ended.err, "");
     }
     EXPECT_FALSE(fs::exists(databaseFile()));
-    EXPECT_NE(run({"--help"}).out.find("--prune"), std::string::npos);
+    EXPECT_TRUE(contains(run({"--help"}).out, "--prune"));
     EXPECT_TRUE(run({"--version"}).out.starts_with("zanoindex "));
 }
 
@@ -311,14 +282,10 @@ TEST_F(ScanTest, DatabaseThatCannotBeUsed) {
     add("x.mp3");
     files::write(databaseFile(), "this is not a database, but it is somebody's file\n");
     const auto before = files::read(databaseFile());
-    const auto ended = run({music()});
-    EXPECT_EQ(ended.status, 1);
-    EXPECT_NE(ended.err.find(databaseFile()), std::string::npos) << ended.err;
+    EXPECT_TRUE(contains(failsAt({music()}), databaseFile()));
     EXPECT_EQ(files::read(databaseFile()), before);
-    const auto other =
-        Process({ZANOINDEX_PROGRAM, {"zanoindex", "--database", "x:y", music()}}).wait();
-    EXPECT_EQ(other.status, 1);
-    EXPECT_NE(other.err, "");
+    const program::Start unknown{ZANOINDEX_PROGRAM, {"zanoindex", "--database", "x:y", music()}};
+    EXPECT_EQ(Process(unknown).wait().status, 1);
 }
 
 TEST_F(ScanTest, SeveralAtOnce) {
@@ -338,21 +305,18 @@ TEST_F(ScanTest, SeveralAtOnce) {
     EXPECT_NO_THROW(mediadb::openCatalogue(location())->check());
 }
 
-TEST_F(ScanTest, OutputThatCannotBeWritten) {
+TEST_F(ScanTest, OutputAndItsLack) {
     add("x.mp3");
-    const auto ended = Process({.path = ZANOINDEX_PROGRAM,
-                                .argv = argumentsOf({music()}),
-                                .output = program::Stream::Full})
-                           .wait();
-    EXPECT_EQ(ended.status, 1);
-    EXPECT_NE(ended.err.find("standard output: No space left"), std::string::npos) << ended.err;
-}
-
-TEST_F(ScanTest, Quiet) {
-    add("x.mp3");
-    const auto ended = run({"-q", music()});
-    EXPECT_EQ(ended.out + ended.err, "");
+    const auto full = Process({.path = ZANOINDEX_PROGRAM,
+                               .argv = argumentsOf({music()}),
+                               .output = program::Stream::Full})
+                          .wait();
+    EXPECT_EQ(full.status, 1);
+    EXPECT_TRUE(contains(full.err, "standard output: No space left"));
+    const auto quiet = run({"-q", music()});
+    EXPECT_EQ(quiet.out + quiet.err, "");
     EXPECT_EQ(paths(), Lines{"x.mp3"});
+    EXPECT_TRUE(contains(failsAt({music() + "/nowhere"}), "/nowhere: No such file or directory"));
 }
 
 }  // namespace

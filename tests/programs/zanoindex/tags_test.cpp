@@ -39,7 +39,7 @@ TEST_F(TagsTest, EveryFormat) {
     }
     const auto summary = summaryOf({music()});
     EXPECT_EQ(songs(), expected);
-    EXPECT_EQ(counts(summary), "added 14, updated 0, unchanged 0, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summary), "added 14");
     const auto lines = sounds();
     ASSERT_EQ(lines.size(), kSuffixes.size());
     for (std::size_t i = 0; i < lines.size(); ++i) {
@@ -94,7 +94,7 @@ TEST_F(TagsTest, WrongSuffixes) {
     }
     run({music()});
     for (const auto &line : songs()) {
-        EXPECT_NE(line.find("|Sødmé 曲|Øyvind|"), std::string::npos) << line;
+        EXPECT_TRUE(contains(line, "|Sødmé 曲|Øyvind|"));
     }
     EXPECT_EQ(paths().size(), std::size(cases));
 }
@@ -110,12 +110,12 @@ TEST_F(TagsTest, WhatIsNotAudioIsNamedAndNotListed) {
     EXPECT_EQ(paths(), std::vector<std::string>{"good.mp3"});
     for (const char *name : {"text.mp3", "empty.flac", "zeros.wav", "page.ogg"}) {
         const auto line = "cannot read " + music() + "/" + name + ": not an audio file\n";
-        EXPECT_NE(ended.err.find(line), std::string::npos) << ended.err;
+        EXPECT_TRUE(contains(ended.err, line));
     }
     // once more: named again, and what was listed before stays when its file is damaged
     files::write(music() + "/good.mp3", "no longer");
     const auto summary = summaryOf({music()});
-    EXPECT_EQ(counts(summary), "added 0, updated 0, unchanged 0, removed 0, kept 0, failed 5");
+    EXPECT_EQ(counts(summary), "failed 5");
     EXPECT_EQ(paths(), std::vector<std::string>{"good.mp3"});
 }
 
@@ -147,9 +147,8 @@ TEST_F(TagsTest, DamagedFiles) {
     EXPECT_EQ(summary["added"].asUInt() + summary["failed"].size(), files);
     EXPECT_GT(summary["failed"].size(), 0U);
     for (const auto &failed : summary["failed"]) {
-        EXPECT_NE(ended.err.find("cannot read " + failed["path"].asString() + ": " +
-                                 failed["reason"].asString()),
-                  std::string::npos);
+        EXPECT_TRUE(contains(ended.err, "cannot read " + failed["path"].asString() + ": " +
+                                            failed["reason"].asString()));
     }
     EXPECT_LT(ended.peakKilobytes, 700 * 1024);
     for (const auto &line : songs()) {
@@ -165,7 +164,7 @@ TEST_F(TagsTest, DemoMusic) {
     EXPECT_EQ(again.status, 0) << again.err;
     EXPECT_EQ(fs::last_write_time(untitled), before) << "a second call does nothing";
     const auto summary = summaryOf({ZANOINDEX_DEMO});
-    EXPECT_EQ(counts(summary), "added 36, updated 0, unchanged 0, removed 0, kept 0, failed 0");
+    EXPECT_EQ(counts(summary), "added 36");
 }
 
 }  // namespace

@@ -5,8 +5,6 @@
 namespace zano::index {
 namespace {
 
-using Lines = std::vector<std::string>;
-
 class WatchTest : public IndexTest {
   protected:
     void start() {
@@ -87,7 +85,7 @@ TEST_F(WatchTest, NamesWhatItCannotRead) {
     EXPECT_EQ(summary["failed"].size(), 1U);
     const auto ended = process_->stop(SIGTERM);
     EXPECT_EQ(ended.status, 0);
-    EXPECT_NE(ended.err.find("/b.mp3: not an audio file"), std::string::npos) << ended.err;
+    EXPECT_TRUE(contains(ended.err, "/b.mp3: not an audio file"));
 }
 
 TEST_F(WatchTest, EndsWhenNothingIsLeft) {
@@ -96,7 +94,7 @@ TEST_F(WatchTest, EndsWhenNothingIsLeft) {
     fs::rename(music(), path("moved"));
     const auto ended = process_->wait();
     EXPECT_EQ(ended.status, 1);
-    EXPECT_NE(ended.err.find("no folder is left to watch"), std::string::npos) << ended.err;
+    EXPECT_TRUE(contains(ended.err, "no folder is left to watch"));
     EXPECT_EQ(paths().size(), 1U) << "a folder that is gone keeps its songs";
 }
 

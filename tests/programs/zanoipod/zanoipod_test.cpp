@@ -1,21 +1,22 @@
 /* From an iPod that libgpod makes, through the program, to the readers of the library. */
 #include <gpod/itdb.h>
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 #include <vorelix/vorelix.h>
 #include <zanoplatform/media_database.h>
 
 #include <algorithm>
-#include <cstdlib>
 #include <functional>
 #include <vector>
 
 #include "support/files.h"
+#include "support/process.h"
+#include "support/text.h"
 #include "system_paths_internal.h"
 
 namespace {
 
 namespace fs = std::filesystem;
+using text::contains;
 
 const std::string kFolder = ZANO_PATH_IPOD_FOLDER;
 const std::string kTracks = kFolder + "tracks.m3u";
@@ -62,10 +63,9 @@ class ZanoIPod : public testing::Test {
 
     /* The exit code, and what is printed to both outputs. */
     int run(const std::string &arguments) {
-        const std::string out = folder_.path("out");
-        const int status = std::system((ZANOIPOD " " + arguments + " >" + out + " 2>&1").c_str());
-        printed_ = files::read(out);
-        return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+        const process::Outcome outcome = process::run(ZANOIPOD " " + arguments + " 2>&1");
+        printed_ = outcome.text;
+        return outcome.status;
     }
 
     /* "title|artist|duration", a line for each track; the files of all have to be there. */
@@ -124,12 +124,12 @@ TEST_F(ZanoIPod, TracksAndPlaylistsReachTheReaders) {
     });
     fs::remove(goneFile);
     EXPECT_EQ(run(ipod_), 0) << printed_;
-    EXPECT_NE(printed_.find("left out 'Gone'"), std::string::npos) << printed_;
+    EXPECT_TRUE(contains(printed_, "left out 'Gone'"));
     const std::string first = "Ærlig: Ø|A  B|215\n";
     const std::string second = std::string(253, 'x') + "||215\n";
     const std::string all = songs(kTracks);
     EXPECT_EQ(all.find(first + second), 0U) << all;
-    EXPECT_NE(all.find(".mp3||215\n"), std::string::npos) << "the name of the file: " << all;
+    EXPECT_TRUE(contains(all, ".mp3||215\n")) << "the name of the file";
     EXPECT_EQ(std::count(all.begin(), all.end(), '\n'), 3);
     EXPECT_EQ(playlists(), "Playlist\nPodcasts\nRoad_Trip 2\nRoad_Trip\n_hidden\n" +
                                std::string(251, 'p') + "\ntracks 2\n");
@@ -152,7 +152,7 @@ TEST_F(ZanoIPod, AnotherIPodTakesThePlaceOfTheOneBefore) {
     const std::string before = files::read(kTracks);
     for (const std::string name : {"none", "song.mp3", "."}) {
         EXPECT_EQ(run(folder_.path(name)), 1) << name;
-        EXPECT_NE(printed_.find("could not read an iPod at"), std::string::npos) << printed_;
+        EXPECT_TRUE(contains(printed_, "could not read an iPod at"));
     }
     EXPECT_EQ(run(""), 2);
     {
