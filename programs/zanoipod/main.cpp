@@ -42,9 +42,10 @@ int writeLists(const std::string &folder) {
     zano::ipod::replaceFolder(lists.substr(0, lists.size() - 1), files);
     tellLeftOut("its file is not there", contents.missing);
     tellLeftOut("its path cannot stand in a list", refused);
-    std::cout << contents.tracks.size() - refused.size() << " tracks, " << files.size() - 1
-              << " playlists\n"
-              << std::flush;
+    const size_t tracks = contents.tracks.size() - refused.size();
+    const size_t playlists = files.size() - 1;
+    std::cout << tracks << (tracks == 1 ? " track, " : " tracks, ") << playlists
+              << (playlists == 1 ? " playlist\n" : " playlists\n") << std::flush;
     return std::cout ? kSuccess : kFailure;
 }
 
