@@ -178,21 +178,16 @@ TEST_F(Playlists, OneIsMeantOrNone) {
 }
 
 TEST_F(Playlists, FilesThatAreNoPlaylistsStayAsTheyAre) {
-    const struct {
-        const char *name;
-        const char *contents;
-        const char *error;
-    } cases[] = {
-        {"page.m3u", "<!DOCTYPE html><html><body>404</body></html>\n", "not a playlist"},
-        {"long.m3u8", "a.mp3\n", "only m3u, pls and wpl are written"},
-    };
-    for (const auto &row : cases) {
-        const fs::path file = music_ / row.name;
-        std::ofstream(file) << row.contents;
-        EXPECT_TRUE(contains(fails({"append", file, "1"}), row.error)) << row.name;
-        EXPECT_EQ(files::read(file), row.contents);
-    }
-    fails({"import", music_ / "page.m3u"});
+    const std::string page = music_ / "page.m3u";
+    const std::string html = "<!DOCTYPE html><html><body>404</body></html>\n";
+    files::write(page, html);
+    files::write(music_ / "long.m3u8", "a.mp3\n");
+    EXPECT_TRUE(contains(fails({"append", page, "1"}), "not a playlist"));
+    EXPECT_TRUE(contains(fails({"append", music_ / "long.m3u8", "1"}),
+                         "only m3u, pls and wpl are written"));
+    EXPECT_EQ(files::read(page), html);
+    EXPECT_EQ(files::read(music_ / "long.m3u8"), "a.mp3\n");
+    fails({"import", page});
     EXPECT_EQ(says({"import", music_ / "long.m3u8"}).find("imported 'long'"), 0U);
     fs::create_directory(music_ / "links");
     fs::create_symlink(shared_ / "long.m3u", music_ / "links/long.m3u");

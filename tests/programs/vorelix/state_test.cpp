@@ -61,10 +61,8 @@ TEST_F(State, CustomKeysAreSetAsTheLibraryWouldWriteThem) {
     const Json::Value key = answerOf({"keys", "get", "2"})["keys"][0];
     EXPECT_EQ(key["title"], "\"Ø\"\n");
     EXPECT_EQ(key["type"], "t");
-    const struct {
-        const char *before;
-        const char *after;  // null: refused
-    } cases[] = {
+    // Before and after; null: refused.
+    const std::pair<const char *, const char *> cases[] = {
         {"[", nullptr},
         {"[1]", nullptr},
         {R"({"items":{}})", nullptr},
@@ -73,16 +71,16 @@ TEST_F(State, CustomKeysAreSetAsTheLibraryWouldWriteThem) {
         {R"(/*c*/{"items":[{"more":1}],"x":2})",
          R"(/*c*/{"items":[{"more":1,"title":"","type":"t","value":""}],"x":2})"},
     };
-    for (const auto &each : cases) {
-        files::write(kKeys, each.before);
-        if (each.after != nullptr) {
+    for (const auto &[before, after] : cases) {
+        files::write(kKeys, before);
+        if (after != nullptr) {
             says({"keys", "set", "1", "--type", "t"});
         } else {
             EXPECT_TRUE(contains(fails({"keys", "set", "1", "--type", "t"}), kKeys));
         }
-        std::string after = files::read(kKeys);
-        std::erase_if(after, [](char c) { return c == ' ' || c == '\n'; });
-        EXPECT_EQ(after, each.after != nullptr ? each.after : each.before);
+        std::string text = files::read(kKeys);
+        std::erase_if(text, [](char c) { return c == ' ' || c == '\n'; });
+        EXPECT_EQ(text, after != nullptr ? after : before);
     }
 }
 

@@ -9,10 +9,7 @@ namespace vorelix {
 namespace {
 
 TEST(Text, NothingThatATerminalObeysIsPrinted) {
-    const struct {
-        std::string text;
-        std::string printed;
-    } cases[] = {
+    const std::pair<std::string, std::string> cases[] = {
         {"plain Ünï 音", "plain Ünï 音"},
         {"\x1b[31mred\x1b]0;title\x07", "␛[31mred␛]0;title␇"},
         {"two\nlines\r\tand\x7f", "two␊lines␍␉and␡"},
@@ -25,8 +22,8 @@ TEST(Text, NothingThatATerminalObeysIsPrinted) {
         {"overlong \xc0\xaf", "overlong \xEF\xBF\xBD\xEF\xBF\xBD"},
         {std::string("nul \0 in", 8), "nul ␀ in"},
     };
-    for (const auto &row : cases) {
-        EXPECT_EQ(printable(row.text), row.printed) << row.text;
+    for (const auto &[text, printed] : cases) {
+        EXPECT_EQ(printable(text), printed) << text;
     }
     EXPECT_EQ(validUtf8("tab\t \x1b \xff"), "tab\t \x1b \xEF\xBF\xBD");
 }

@@ -16,6 +16,7 @@ using http_server::Reply;
 using http_server::reply;
 using http_server::Server;
 using http_server::Then;
+using text::repeated;
 
 std::string escaped(const std::string &text) {
     std::string out;
@@ -85,21 +86,10 @@ void expectBrowsed(const std::vector<Reply> &replies, const std::string &out,
 std::string entityBomb() {
     std::string text = "<!DOCTYPE a [<!ENTITY e0 \"haha\">";
     for (int i = 1; i < 12; ++i) {
-        text += "<!ENTITY e" + std::to_string(i) + " \"";
-        for (int k = 0; k < 10; ++k) {
-            text += "&e" + std::to_string(i - 1) + ";";
-        }
-        text += "\">";
+        text += "<!ENTITY e" + std::to_string(i) + " \"" +
+                repeated(10, "&e" + std::to_string(i - 1) + ";") + "\">";
     }
     return text + "]><a>&e11;</a>";
-}
-
-std::string nested(int levels, const std::string &inside) {
-    std::string text = inside;
-    for (int i = 0; i < levels; ++i) {
-        text = "<a>" + text + "</a>";
-    }
-    return text;
 }
 
 TEST(MediaServers, ThatMisbehaveAreReported) {
@@ -144,7 +134,8 @@ TEST(MediaServers, ThatMisbehaveAreReported) {
         {{reply(cdata)}, " x\n"},
         {{reply(entities)}, " It's &foo; &\n"},
         {{reply(external + "<DIDL-Lite>" + item(1, "&e;&f;") + "</DIDL-Lite>")}, "1   item"},
-        {{reply(answer(nested(1000, item(1, "Deep"))))}, " Deep\n"},
+        {{reply(answer(repeated(1000, "<a>") + item(1, "Deep") + repeated(1000, "</a>")))},
+         " Deep\n"},
         {{reply("busy", "503 Busy"), reply(error501), reply(answer(item(1))), reply(answer(""))},
          "objects 1-1 of 1\n"},
         // The same page again, and totals that never come true.

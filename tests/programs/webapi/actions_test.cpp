@@ -200,11 +200,10 @@ TEST_F(Front, LocalServerAnswersItsOwnNameOnly) {
         {"127.0.0.1.evil.example", "403 address"},
         {"localhost.evil:80", "403 address"}};
     for (const auto &[host, outcome] : cases) {
-        const std::string end =
-            std::string(" HTTP/1.1\r\nConnection: close\r\nHost: ") + host + "\r\n\r\n";
-        EXPECT_EQ(askRaw("GET /webapi?action=rights" + end).outcome(), outcome) << host;
+        const Ask question{.query = "action=rights", .user = nullptr, .host = host};
+        EXPECT_EQ(ask(question).outcome(), outcome) << host;
     }
-    const Answer page = askRaw("GET / HTTP/1.1\r\nHost: localhost\r\nConnection: close\r\n\r\n");
+    const Answer page = ask({.user = nullptr, .path = "/", .host = "localhost"});
     EXPECT_EQ(page.status, 200);
     EXPECT_EQ(page.headers.at("content-type"), "text/html; charset=utf-8");
     EXPECT_EQ(page.headers.at("content-security-policy"),

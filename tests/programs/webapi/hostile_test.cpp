@@ -3,10 +3,13 @@
 #include <regex>
 #include <set>
 
+#include "support/text.h"
 #include "web_server.h"
 
 namespace web_test {
 namespace {
+
+using text::repeated;
 
 struct Parameter {
     const char *action;
@@ -14,14 +17,6 @@ struct Parameter {
     const char *others;  // what else the action needs
     bool isChange;
 };
-
-std::string times(size_t count, const std::string &text) {
-    std::string all;
-    for (size_t i = 0; i < count; ++i) {
-        all += text;
-    }
-    return all;
-}
 
 /* Whether the web server itself refuses an address with this: control characters and bytes that
  * no UTF-8 has. */
@@ -57,12 +52,12 @@ std::vector<Values> badValues() {
          {"playlist-delete", "id", "", true},
          {"key-set", "key", "type=a&value=b&title=c", true}},
         {"", "x", "-1", "+1", "1x", "%201", "0x1", "2147483648", "99999999999999999999",
-         "1%20or%201=1", "1%FF", "1%00", times(2000, "9")}};
+         "1%20or%201=1", "1%FF", "1%00", repeated(2000, "9")}};
     const Values lists = {{{"playlist-append", "songs", "id=1", true},
                            {"playlist-remove", "positions", "id=1&total=3", true},
                            {"playlist-create", "songs", "title=bad", true}},
                           {"x", "1,,2", "1,", ",1", "1;2", "-1", "1,2147483648", "1)%20or%20(1=1",
-                           "%FF", times(20000, "1,") + "1"}};
+                           "%FF", repeated(20000, "1,") + "1"}};
     const Values choices = {{{"songs", "category", "keyword=a", false},
                              {"songs", "sort", "", false},
                              {"songs", "direction", "", false},
@@ -73,18 +68,18 @@ std::vector<Values> badValues() {
                            {"songs", "artist", "", false},
                            {"songs", "album", "", false},
                            {"songs", "genre", "", false}},
-                          {"%FF", "%ED%A0%80", "a%00b", times(1025, "a")}};
+                          {"%FF", "%ED%A0%80", "a%00b", repeated(1025, "a")}};
     const Values keys = {{{"key-set", "key", "type=a&value=b&title=c", true}}, {"0", "5", "1,2"}};
     const Values keyTexts = {{{"key-set", "type", "key=1&value=b&title=c", true},
                               {"key-set", "value", "key=1&type=b&title=c", true},
                               {"key-set", "title", "key=1&type=b&value=c", true}},
-                             {"%FF", "a%00b", times(1025, "a")}};
+                             {"%FF", "a%00b", repeated(1025, "a")}};
     const Values titles = {{{"playlist-create", "title", "", true}},
                            {"", ".hidden", "a/b", "..%2F..%2Fx", "%0A", "%1B[2J", "a%00b", "%FF",
-                            times(252, "a"), times(1000000, "a")}};
+                            repeated(252, "a"), repeated(1000000, "a")}};
     const Values streams = {
         {{"stream", "song", "", false}, {"mimetype", "extension", "", false}},
-        {"", "%22", "../x", "a.b", times(1025, "a"), "%FF", "x%00", "12345/", "zzzzzz."}};
+        {"", "%22", "../x", "a.b", repeated(1025, "a"), "%FF", "x%00", "12345/", "zzzzzz."}};
     return {numbers, lists, choices, texts, keys, keyTexts, titles, streams};
 }
 
@@ -131,16 +126,13 @@ TEST_F(Hostile, BadValuesOfEveryParameter) {
 }
 
 TEST_F(Hostile, WhatIsMissingOrNotThere) {
-    const struct {
-        Ask ask;
-        const char *outcome;
-    } cases[] = {
+    const std::pair<Ask, const char *> cases[] = {
         {{.query = ""}, "404 action"},
         {{.query = "action="}, "404 action"},
         {{.query = "action=Songs"}, "404 action"},
         {{.query = "action=songs%20"}, "404 action"},
         {{.query = "action=../songs"}, "404 action"},
-        {{.query = "action=" + times(7000, "a")}, "404 action"},
+        {{.query = "action=" + repeated(7000, "a")}, "404 action"},
         {{.query = "action=nope", .form = "a=1"}, "404 action"},
         {{.query = "action=songs&action=nope"}, "404 action"},
         {{.query = "action=songs%FF"}, "400 request"},
@@ -175,13 +167,27 @@ TEST_F(Hostile, WhatIsMissingOrNotThere) {
           .form = "x",
           .headers = "Content-Type: text/plain\r\n"},
          "400 body"},
-        {{.query = "action=playlist-delete", .form = "id=1&x=" + times(1U << 20, "a")}, "413 body"},
-        {{.query = "action=playlist-delete", .form = "id=1&x=" + times(3U << 20, "a")}, "413 body"},
-        {{.query = "action=songs&keyword=" + times(1U << 20, "a")}, "431 request"},
+        {{.query = "action=playlist-delete", .form = "id=1&x=" + repeated(1U << 20, "a")},
+         "413 body"},
+        {{.query = "action=playlist-delete", .form = "id=1&x=" + repeated(3U << 20, "a")},
+         "413 body"},
+        {{.query = "action=songs&keyword=" + repeated(1U << 20, "a")}, "431 request"},
+        {{.query = "action=songs", .method = "FOO"}, "501 method"},
+        {{.query = "action=songs&keyword=\xFF"}, "400 request"},
+        {{.query = "action=songs", .path = "/webapi/x"}, "404 address"},
+        {{.query = "action=songs", .path = "/webapi2"}, "404 address"},
+        {{.path = "/../../../../etc/passwd"}, "404 address"},
+        {{.path = "/%2e%2e/%2e%2e/etc/passwd"}, "404 address"},
+        {{.path = "/errors/error-404.html"}, "404 address"},
+        {{.query = "action=rights", .user = nullptr}, "401 user"},
+        {{.query = "action=rights", .user = &kLiar, .headers = "Remote-User: admin\r\n"},
+         "401 user"},
     };
-    for (const auto &row : cases) {
-        EXPECT_EQ(ask(row.ask).outcome(), row.outcome)
-            << row.ask.query.substr(0, 80) << " " << row.ask.form.substr(0, 80);
+    for (const auto &[asked, outcome] : cases) {
+        SCOPED_TRACE(asked.path + "?" + asked.query.substr(0, 80) + asked.form.substr(0, 80));
+        const Answer answer = ask(asked);
+        EXPECT_EQ(answer.outcome(), outcome);
+        EXPECT_EQ(answer.headers.at("content-type"), "application/json");
     }
 }
 
@@ -194,29 +200,7 @@ TEST_F(Hostile, HugeNumbersAreNoFault) {
     }
 }
 
-TEST_F(Hostile, OtherMethodsAndWhatIsNoRequestOfOurs) {
-    const std::string login = std::string("Authorization: ") + kAdmin.credentials + "\r\n";
-    const std::string end =
-        " HTTP/1.1\r\nHost: 127.0.0.1\r\nConnection: close\r\n" + login + "\r\n";
-    const std::pair<std::string, const char *> cases[] = {
-        {"FOO /webapi?action=songs" + end, "501 method"},
-        {"GET /webapi?action=songs&keyword=\xFF" + end, "400 request"},
-        {"GET /webapi/x?action=songs" + end, "404 address"},
-        {"GET /webapi2?action=songs" + end, "404 address"},
-        {"GET /../../../../etc/passwd" + end, "404 address"},
-        {"GET /%2e%2e/%2e%2e/etc/passwd" + end, "404 address"},
-        {"GET /errors/error-404.html" + end, "404 address"},
-        {"GET /webapi?action=rights HTTP/1.1\r\nHost: 127.0.0.1\r\nConnection: close\r\n\r\n",
-         "401 user"},
-        {"GET /webapi?action=rights HTTP/1.1\r\nHost: 127.0.0.1\r\nConnection: close\r\n"
-         "Remote-User: admin\r\nAuthorization: Basic YWRtaW46eQ==\r\n\r\n",
-         "401 user"},
-    };
-    for (const auto &[request, outcome] : cases) {
-        const Answer answer = askRaw(request);
-        EXPECT_EQ(answer.outcome(), outcome) << request;
-        EXPECT_EQ(answer.headers.at("content-type"), "application/json") << request;
-    }
+TEST_F(Hostile, OtherMethods) {
     const std::pair<const char *, const char *> methods[] = {
         {"songs", "GET, HEAD"}, {"stream", "GET, HEAD"}, {"playlist-delete", "POST"}};
     for (const auto &[action, allowed] : methods) {
@@ -249,11 +233,10 @@ TEST_F(Hostile, ChangesThatAnotherSiteAsksFor) {
             outcome)
             << headers;
     }
-    const std::string body = "id=9";
-    EXPECT_EQ(askRaw("POST /webapi?action=playlist-delete HTTP/1.1\r\nHost: NAS:8080\r\n"
-                     "Origin: http://nas:8080\r\nConnection: close\r\nContent-Length: 4\r\n"
-                     "Content-Type: application/x-www-form-urlencoded\r\nAuthorization: " +
-                     std::string(kAdmin.credentials) + "\r\n\r\n" + body)
+    EXPECT_EQ(ask({.query = "action=playlist-delete",
+                   .form = "id=9",
+                   .headers = "Origin: http://nas:8080\r\n",
+                   .host = "NAS:8080"})
                   .outcome(),
               "404 id");
 }

@@ -137,10 +137,7 @@ TEST_F(Streams, NeverLeaveTheMusicFolder) {
 TEST_F(Streams, RunNoScript) {
     files::write(folder() / "page.html", "<script>1</script>");
     addSong(folder() / "page.html", "page");
-    const Answer answer =
-        askRaw("GET /webapi?" + streamOf("page") +
-               " HTTP/1.1\r\nHost: h\r\nConnection: close\r\nAuthorization: " + kAdmin.credentials +
-               "\r\n\r\n");
+    const Answer answer = ask({.query = streamOf("page")});
     EXPECT_EQ(answer.headers.at("x-content-type-options"), "nosniff");
     EXPECT_EQ(answer.headers.at("content-type"), "application/octet-stream");
 }

@@ -206,8 +206,9 @@ Answer Front::askRaw(const std::string &request) const {
 
 Answer Front::ask(const Ask &ask) const {
     const std::string method = !ask.method.empty() ? ask.method : ask.form.empty() ? "GET" : "POST";
-    std::string request = method + " /webapi?" + ask.query +
-                          " HTTP/1.1\r\nHost: 127.0.0.1:" + std::to_string(port_) +
+    const std::string own = "127.0.0.1:" + std::to_string(port_);
+    std::string request = method + " " + ask.path + "?" + ask.query +
+                          " HTTP/1.1\r\nHost: " + (ask.host.empty() ? own : ask.host) +
                           "\r\nConnection: close\r\n" + ask.headers;
     if (ask.user != nullptr) {
         request += std::string("Authorization: ") + ask.user->credentials + "\r\n";

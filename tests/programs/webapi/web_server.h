@@ -25,13 +25,16 @@ inline constexpr User kAdmin{"admin", "Basic YWRtaW46eA==", 31};
 inline constexpr User kStreamer{"sam", "Basic c2FtOng=", 2};
 inline constexpr User kLister{"pat", "Basic cGF0Ong=", 4};
 inline constexpr User kNobody{"none", "Basic bm9uZTp4", 0};
+inline constexpr User kLiar{"admin", "Basic YWRtaW46eQ==", 0};  // another password
 
 struct Ask {
-    std::string query = "";  // behind "/webapi?"
+    std::string query = "";  // behind "?"
     std::string form = "";   // not "": a POST
     const User *user = &kAdmin;
     std::string method = "";   // "": GET or POST
     std::string headers = "";  // with line ends
+    std::string path = "/webapi";
+    std::string host = "";  // "": the server's address and port
 };
 
 struct Answer {
@@ -59,8 +62,6 @@ class Front : public testing::Test {
     void addSong(const std::filesystem::path &path, const std::string &title);
 
     Answer ask(const Ask &ask) const;
-    /* What the server answers to these very bytes. */
-    Answer askRaw(const std::string &request) const;
     /* The body of a successful answer. */
     Json::Value get(const std::string &query) const;
     Json::Value post(const std::string &query, const std::string &form) const;
@@ -73,6 +74,8 @@ class Front : public testing::Test {
   private:
     void serve(const std::string &configuration, std::map<std::string, std::string> environment);
     int connectToServer() const;
+    /* What the server answers to these very bytes. */
+    Answer askRaw(const std::string &request) const;
 
     const files::Places places_{ZANO_PATH_CONF,         ZANO_PATH_PASSWD,
                                 ZANO_PATH_GROUP,        ZANO_PATH_AUDIO_USERS,

@@ -9,6 +9,7 @@
 #include "formats.h"
 #include "progress.h"
 #include "support/files.h"
+#include "support/text.h"
 #include "text.h"
 #include "wire.h"
 
@@ -16,12 +17,8 @@ namespace zano::index {
 namespace {
 
 TEST(IndexText, StorableText) {
-    struct Case {
-        std::string bytes;
-        std::string text;
-    };
     const std::string a4096(4096, 'a');
-    const Case cases[] = {
+    const std::pair<std::string, std::string> cases[] = {
         {"plain", "plain"},
         {"  blanks  ", "blanks"},
         {"Beyonc\xC3\xA9", "Beyoncé"},
@@ -36,14 +33,7 @@ TEST(IndexText, StorableText) {
         {"\n \t", ""},
         {a4096 + "b", a4096},
         {std::string(4095, 'a') + "é", std::string(4095, 'a')},
-        {std::string(3 << 20U, '\xE9'),
-         [] {
-             std::string text;
-             while (text.size() < 4096) {
-                 text += "é";
-             }
-             return text;
-         }()},
+        {std::string(3 << 20U, '\xE9'), text::repeated(2048, "é")},
     };
     for (const auto &[bytes, text] : cases) {
         EXPECT_EQ(storableText(bytes), text) << "of " << printable(bytes.substr(0, 80));
@@ -143,7 +133,7 @@ TEST(IndexProgress, TextAndBar) {
               "reading tags: 100 of 1000000 files, 10 files/s, 27:46:30 left");
     const PhaseState half = {Phase::kReading, 10, 20, 0};
     EXPECT_EQ(progressBar(half, 50, false), "[=========          ] reading tags: 10 of 20 files");
-    EXPECT_NE(progressBar(half, 50, true).find("\033["), std::string::npos);
+    EXPECT_TRUE(text::contains(progressBar(half, 50, true), "\033["));
     for (std::size_t width = 0; width < 100; ++width) {
         EXPECT_LE(progressBar(half, width, false).size(), width);
     }

@@ -253,7 +253,7 @@ TEST_F(ScanTest, Notices) {
     engine->addNotice({0, moved, other, 4});
     const auto ended = run({"--notices"});
     EXPECT_EQ(ended.status, 0) << ended.err;
-    EXPECT_EQ(ended.out.substr(0, ended.out.rfind("\n", ended.out.size() - 2) + 1),
+    EXPECT_EQ(ended.out.substr(0, ended.out.rfind('\n', ended.out.size() - 2) + 1),
               "playlist /lists/a.m3u was added\nsong " + fresh + " was added\nsong " + song +
                   " was changed\nsong " + moved + " was changed and moved from " + other + "\n");
     EXPECT_EQ(paths(), (Lines{"a/0.ogg", "moved.ogg", "new.ogg"}));
