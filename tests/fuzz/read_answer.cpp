@@ -1,5 +1,3 @@
-#include "read_answer.h"
-
 #include <vorelix/upnp/dmaparser.h>
 
 #include <algorithm>
@@ -8,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-#include "require.h"
+#include "readers.h"
 
 namespace vorelix::fuzz {
 namespace {

@@ -1,17 +1,15 @@
-#include "read_playlist.h"
-
 #include <cstring>
 #include <string>
 
 #include "playlists/format.h"
 #include "playlists/locations.h"
 #include "playlists/text.h"
-#include "require.h"
+#include "readers.h"
 
-namespace zano::playlists {
+namespace vorelix::fuzz {
 namespace {
 
-using vorelix::fuzz::require;
+using namespace zano::playlists;
 
 bool isPath(std::string_view path) {
     return !path.empty() && path.front() == '/' && path.find('\0') == std::string_view::npos;
@@ -30,13 +28,13 @@ void check(Playlist &playlist, std::string_view folder) {
         for (const std::string &other : locations.otherPaths(entry)) {
             require(isPath(other) && other != path);
         }
-        require(isUtf8(fromWindows1252(entry.tags.title)));
+        require(zano::isUtf8(fromWindows1252(entry.tags.title)));
     }
 }
 
 }  // namespace
 
-void readAsEveryKind(const std::uint8_t *bytes, std::size_t size) {
+void readAsPlaylist(const std::uint8_t *bytes, std::size_t size) {
     const std::string_view all(reinterpret_cast<const char *>(bytes), size);
     for (const char *name : {"/m/a.m3u", "/m/a.pls", "/m/a.wpl", "/m/a"}) {
         std::string converted;
@@ -51,4 +49,4 @@ void readAsEveryKind(const std::uint8_t *bytes, std::size_t size) {
     }
 }
 
-}  // namespace zano::playlists
+}  // namespace vorelix::fuzz

@@ -1,8 +1,6 @@
 // This file defines what a fortified build would turn into other calls.
 #undef _FORTIFY_SOURCE
 
-#include "read_state.h"
-
 #include <sys/mman.h>
 #include <syslog.h>
 #include <unistd.h>
@@ -18,7 +16,7 @@
 #include <string>
 
 #include "config/line_internal.h"
-#include "require.h"
+#include "readers.h"
 #include "system_paths_internal.h"
 
 // Failures are what inputs are for; nobody's log is filled with them.
