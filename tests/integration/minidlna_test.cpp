@@ -2,13 +2,15 @@
 #include <gtest/gtest.h>
 
 #include <chrono>
+#include <csignal>
 #include <cstdint>
 #include <set>
 #include <thread>
 
 #include "command_line.h"
-#include "minidlna.h"
+#include "support/files.h"
 #include "support/json.h"
+#include "support/program.h"
 
 namespace integration {
 namespace {
@@ -16,6 +18,40 @@ namespace {
 using command_line::run;
 
 constexpr const char *kAllMusic = "1$4";
+
+/* A MiniDLNA of a test's own, over the demo music: on the loopback interface and a free port, with
+ * its database in a folder that goes with it. It ends with the test, however that ends. */
+class MiniDlna {
+  public:
+    MiniDlna() {
+        files::write(folder_.path("minidlna.conf"),
+                     "port=" + std::to_string(port_) +
+                         "\nnetwork_interface=lo\nmedia_dir=A," VORELIX_MUSIC "\nfriendly_name=" +
+                         name() + "\ndb_dir=" + folder_.path("") + "\nlog_dir=" + folder_.path("") +
+                         "\ninotify=no\nnotify_interval=60\n");
+    }
+
+    std::string name() const { return "R & B " + std::to_string(port_); }
+    std::string url(const std::string &path) const {
+        return "http://127.0.0.1:" + std::to_string(port_) + path;
+    }
+    /* Of the ContentDirectory. */
+    std::string control() const { return url("/ctl/ContentDir"); }
+    /* What it has to say, for messages of tests that fail. */
+    std::string log() const { return files::read(folder_.path("minidlna.log")); }
+    /* In the foreground, as system managers want it. */
+    program::Start start() const {
+        return {.path = VORELIX_MINIDLNAD,
+                .argv = {"minidlnad", "-S", "-f", folder_.path("minidlna.conf"), "-P",
+                         folder_.path("pid")},
+                .output = program::Stream::Nowhere,
+                .errors = program::Stream::Nowhere};
+    }
+
+  private:
+    const files::Folder folder_;
+    const int port_ = program::freePort();
+};
 
 struct Music {
     int files = 0;
@@ -61,8 +97,11 @@ class MiniDlnaTest : public testing::Test {
         return ended.out;
     }
 
+    void TearDown() override { process_.stop(SIGTERM); }
+
     const Music music_ = music();
-    const MiniDlna server_{VORELIX_MUSIC};
+    const MiniDlna server_;
+    program::Process process_{server_.start()};
 };
 
 TEST_F(MiniDlnaTest, AnswersTheCommands) {
