@@ -11,6 +11,7 @@ namespace {
 
 namespace fs = std::filesystem;
 using files::Folder;
+using stand_in::takeTrace;
 
 /* A store that holds a text. */
 struct Store : AudioUsers {
@@ -50,7 +51,7 @@ TEST_F(Permissions, OfAnEntryAreItsTrueFlags) {
         EXPECT_EQ(store.GetUser(13), 2U);
     }
     EXPECT_EQ(Store("null").GetUser(1024), 2U);
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Permissions, ThatWereAskedForAndMissingAreWrittenAsNull) {
@@ -100,7 +101,7 @@ TEST_F(Permissions, OfANameNeedThePrivilegeAndTheFile) {
         ZANO_PATH_GROUP,
         "Other:x:1:carl\nZANO.VXT.Vorelix.Application:x:2:ann,bob,administrator,gone,boss\n");
     expectEach({{"admin", 31}, {"ADmIN", 31}, {"ann", 0}, {"administrator", 0}});
-    EXPECT_EQ(stand_in::takeTrace(), "") << "a missing file is no failure";
+    EXPECT_EQ(takeTrace(), "") << "a missing file is no failure";
 
     files::write(ZANO_PATH_AUDIO_USERS,
                  R"({"1024":{},"1026":{"usb":true},"1028":{"upnp":true},"1029":{"usb":true}})");
@@ -113,13 +114,13 @@ TEST_F(Permissions, OfANameNeedThePrivilegeAndTheFile) {
                 {"boss", 31},
                 {"", 0},
                 {"ádmin", 0}});
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 
     files::write(ZANO_PATH_AUDIO_USERS, "{");
     expectEach({{"Admin", 31}});
-    EXPECT_EQ(stand_in::takeTrace(), "") << "the file is not read for the administrator";
+    EXPECT_EQ(takeTrace(), "") << "the file is not read for the administrator";
     expectEach({{"ann", 0}});
-    EXPECT_NE(stand_in::takeTrace(), "");
+    EXPECT_NE(takeTrace(), "");
 }
 
 TEST_F(Permissions, OfUsersThatAreGoneAreSynchronised) {

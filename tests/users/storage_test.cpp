@@ -4,28 +4,27 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
-#include <sys/wait.h>
 #include <unistd.h>
 #include <vorelix/users/audiousers.h>
 
 #include <csignal>
-#include <random>
-#include <thread>
 #include <utility>
 
+#include "support/failing_allocator.h"
 #include "support/files.h"
 #include "support/platform_stand_in.h"
+#include "support/process.h"
 
 namespace {
 
-bool diesAmidWrite = false;
+int writesToDeath = 0;  // the process dies amid the last of so many
 
 }  // namespace
 
 // Takes the place of the system's function for this program.
 extern "C" __attribute__((visibility("default"))) ssize_t write(int file, const void *text,
                                                                 size_t size) {
-    if (diesAmidWrite) {
+    if (writesToDeath > 0 && --writesToDeath == 0) {
         syscall(SYS_write, file, text, size / 2);
         raise(SIGKILL);
     }
@@ -36,6 +35,8 @@ namespace {
 
 namespace fs = std::filesystem;
 using files::Folder;
+using stand_in::outcome;
+using stand_in::takeTrace;
 
 class UsersFile : public stand_in::Test {
   protected:
@@ -63,23 +64,21 @@ TEST_F(UsersFile, IsReplacedWholeAndForAllToRead) {
     EXPECT_TRUE(users.Save(folder_.path("new")));
     umask(mask);
     EXPECT_EQ(fs::status(folder_.path("new")).permissions(), fs::perms(0644));
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(UsersFile, StaysWhenItCannotBeWritten) {
     AudioUsers users;
     files::write(path_, "before");
     fs::create_symlink("/dev/full", path_ + ".tmp");
-    EXPECT_FALSE(users.Save(path_));
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 audiousers (146) Failed to write " + path_ + ".tmp. (No space left on device)\n");
+    EXPECT_EQ(outcome(users.Save(path_)), "0 3 audiousers (146) Failed to write " + path_ +
+                                              ".tmp. (No space left on device)\n");
     EXPECT_TRUE(fs::is_symlink(path_ + ".tmp")) << "the temporary file stays";
 
     fs::remove(path_ + ".tmp");
     fs::create_directory(path_ + ".tmp");
-    EXPECT_FALSE(users.Save(path_));
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 audiousers (153) Failed to open " + path_ + ".tmp. (Is a directory)\n");
+    EXPECT_EQ(outcome(users.Save(path_)),
+              "0 3 audiousers (153) Failed to open " + path_ + ".tmp. (Is a directory)\n");
     EXPECT_EQ(files::read(path_), "before");
 
     const std::string folder = folder_.path("folder");
@@ -95,18 +94,14 @@ TEST_F(UsersFile, IsNotWrittenThroughDescriptorZero) {
     EXPECT_EQ(fcntl(STDIN_FILENO, F_GETFD), -1) << "the descriptor is closed again";
     dup2(input, STDIN_FILENO);
     close(input);
-    EXPECT_TRUE(stand_in::takeTrace().starts_with("3 audiousers (153) Failed to open " + path_ +
-                                                  ".tmp. ("));
+    EXPECT_TRUE(takeTrace().starts_with("3 audiousers (153) Failed to open " + path_ + ".tmp. ("));
     EXPECT_FALSE(fs::exists(path_));
 }
 
 TEST_F(UsersFile, ThatCannotBeReadLeavesTheStoreAsItWas) {
     constexpr std::size_t kLimit = 1048576;
     const std::string parsing = "3 Error: parsing error, reason = ";
-    const struct {
-        std::string text;
-        std::string trace;  // its beginning
-    } cases[] = {
+    const std::pair<std::string, std::string> cases[] = {
         {"", parsing + "* Line 1, Column 1\n  Syntax error: value, object or array expected.\n\n"},
         {R"({"12":{})", parsing + "* Line 1, Column 9\n  Missing ',' or '}'"},
         {"[1,2]", parsing + "The root is not an object.\n\n"},
@@ -119,19 +114,19 @@ TEST_F(UsersFile, ThatCannotBeReadLeavesTheStoreAsItWas) {
     AudioUsers users;
     users.SetUser(5, 1);
     const std::string before = asText(users);
-    for (const auto &each : cases) {
-        files::write(path_, each.text);
-        EXPECT_FALSE(users.Read(path_)) << each.text.substr(0, 20);
-        EXPECT_TRUE(stand_in::takeTrace().starts_with(each.trace)) << each.text.substr(0, 20);
+    for (const auto &[text, trace] : cases) {
+        files::write(path_, text);
+        EXPECT_FALSE(users.Read(path_)) << text.substr(0, 20);
+        EXPECT_TRUE(takeTrace().starts_with(trace)) << text.substr(0, 20);
         EXPECT_EQ(asText(users), before);
     }
     EXPECT_FALSE(users.Read(folder_.path("missing")));
-    EXPECT_EQ(stand_in::takeTrace(), "");
-    EXPECT_FALSE(users.Read(path_ + "/below a file"));
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 audiousers (174) Failed to open " + path_ + "/below a file. (Not a directory)\n");
+    EXPECT_EQ(takeTrace(), "");
+    EXPECT_EQ(
+        outcome(users.Read(path_ + "/below a file")),
+        "0 3 audiousers (174) Failed to open " + path_ + "/below a file. (Not a directory)\n");
     EXPECT_FALSE(users.Read(folder_.path(".")));
-    const std::string trace = stand_in::takeTrace();
+    const std::string trace = takeTrace();
     EXPECT_TRUE(trace.starts_with("3 audiousers (196) read file failed. (-1) != (")) << trace;
     EXPECT_TRUE(trace.ends_with("), errno=Is a directory\n")) << trace;
     EXPECT_EQ(asText(users), before);
@@ -149,65 +144,39 @@ TEST_F(UsersFile, MayHoldAMebibyteCommentsAndANul) {
         EXPECT_EQ(users.GetUser(12), 1U);
         EXPECT_EQ(users.GetUser(5), 2U) << "what was there before is gone";
     }
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
-/* Two stores whose files are of some hundred kilobytes, so that writing them takes a while. */
-struct TwoStores {
-    AudioUsers stores[2];
-    std::string texts[2];
-    TwoStores() {
-        constexpr unsigned int kUsers = 3000;
-        for (unsigned int at = 0; at < 2; ++at) {
-            for (unsigned int uid = 1; uid <= kUsers; ++uid) {
-                stores[at].SetUser(uid, at == 0 ? 31 : 0);
-            }
-            texts[at] = asText(stores[at]);
-        }
-    }
-};
-
-TEST_F(UsersFile, OfAWriterKilledAmidItsWriteIsTheOneBefore) {
-    TwoStores two;
-    ASSERT_TRUE(two.stores[0].Save(path_));
-    const pid_t child = fork();
-    if (child == 0) {
-        diesAmidWrite = true;
-        two.stores[1].Save(path_);
-        _exit(0);
-    }
-    int status = 0;
-    ASSERT_EQ(waitpid(child, &status, 0), child);
-    ASSERT_TRUE(WIFSIGNALED(status));
-    EXPECT_EQ(files::read(path_ + ".tmp").size(), two.texts[1].size() / 2);
-    EXPECT_TRUE(files::read(path_) == two.texts[0]);
-    EXPECT_TRUE(two.stores[1].Save(path_));
-    EXPECT_TRUE(files::read(path_) == two.texts[1]) << "the next save goes over what was left";
+TEST_F(UsersFile, ThatFindsNoRoomIsNotRead) {
+    const std::string text(7777, ' ');
+    files::write(path_, text + "{}");
+    AudioUsers users;
+    failing_allocator::failOnSize(text.size() + 3);
+    EXPECT_FALSE(users.Read(path_));
+    EXPECT_TRUE(failing_allocator::hasFailed());
+    EXPECT_EQ(takeTrace(), "3 audiousers (190) Failed to malloc(7779).\n");
+    EXPECT_TRUE(users.Read(path_));
 }
 
-TEST_F(UsersFile, OfAWriterKilledAtAnyMomentIsOneOfTheTwo) {
-    TwoStores two;
-    ASSERT_TRUE(two.stores[0].Save(path_));
-    const auto seed = std::random_device()();
-    std::mt19937 random(seed);
-    constexpr int kKills = 50;
-    constexpr int kLongestMicroseconds = 60000;
-    std::uniform_int_distribution<int> delay(0, kLongestMicroseconds);
-    for (int kill = 0; kill < kKills; ++kill) {
-        const pid_t child = fork();
-        if (child == 0) {
-            for (unsigned int save = 1;; ++save) {
-                two.stores[save % 2].Save(path_);
-            }
-        }
-        // The moment itself is what is random here.
-        std::this_thread::sleep_for(std::chrono::microseconds(delay(random)));
-        ASSERT_EQ(::kill(child, SIGKILL), 0);
-        ASSERT_EQ(waitpid(child, nullptr, 0), child);
-        const std::string text = files::read(path_);
-        ASSERT_TRUE(text == two.texts[0] || text == two.texts[1])
-            << "seed " << seed << ", kill " << kill << ": " << text.size() << " bytes";
+/* Killed amid each of its writes, the file is some hundred kilobytes long. */
+TEST_F(UsersFile, OfAKilledWriterIsTheOneBefore) {
+    AudioUsers users;
+    EXPECT_TRUE(users.Save(path_));
+    for (unsigned int uid = 1; uid <= 3000; ++uid) {
+        users.SetUser(uid, 31);
     }
+    const std::string after = asText(users);
+    int writes = 0;
+    for (int status = 128 + SIGKILL; status != 0; ++writes) {
+        ASSERT_EQ(status, 128 + SIGKILL);
+        EXPECT_TRUE(files::read(path_) == "{}\n") << writes << " writes";
+        status = process::statusOf(process::start([&] {
+            writesToDeath = writes + 1;
+            return users.Save(path_) ? 0 : 1;
+        }));
+    }
+    EXPECT_GT(writes, 1);
+    EXPECT_TRUE(files::read(path_) == after) << "the last save goes over what was left";
 }
 
 }  // namespace
