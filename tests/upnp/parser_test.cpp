@@ -39,6 +39,26 @@ std::string dumpOf(const std::string &text) {
     return dump(parser);
 }
 
+std::string repeated(const std::string &text, int times) {
+    std::string made;
+    for (int i = 0; i < times; ++i) {
+        made += text;
+    }
+    return made;
+}
+
+/* Declarations of entities of which each is ten times the one before; "%" makes them parameter
+ * entities. */
+std::string bomb(const std::string &kind, const std::string &first, int levels) {
+    const std::string declare = "<!ENTITY " + (kind == "%" ? kind + " " : "") + "e";
+    std::string text = declare + "0 \"" + first + "\">";
+    for (int i = 1; i < levels; ++i) {
+        text += declare + std::to_string(i) + " \"" +
+                repeated((kind == "%" ? "&#37;e" : "&e") + std::to_string(i - 1) + ";", 10) + "\">";
+    }
+    return text;
+}
+
 /* As a server sends it and an agent decodes it. */
 std::string answer(const std::string &didl, const std::string &counts = "") {
     return "<?xml version=\"1.0\" encoding=\"utf-8\"?>\n<s:Envelope "
@@ -109,15 +129,11 @@ TEST(Parser, KeepsTheLaterOfTheTwoCounts) {
 TEST(Parser, AddsToItsListsAndLeavesThemAloneWhenThereIsNoDocument) {
     Parser parser;
     ASSERT_EQ(parser.parse(answer("<item id=\"1\"/>", "<TotalMatches>1</TotalMatches>")), 0);
-    std::string nested;
-    for (int i = 0; i < 300; ++i) {
-        nested = "<a>" + nested + "</a>";
-    }
     testing::internal::CaptureStderr();
     for (const std::string &bad :
          {std::string(), std::string("no XML"), answer("<item>R & B</item>"),
           answer("<item id=\"2\">"), answer("<item id=\"2\"/>\xE9\xFF"),
-          answer("<item id=\"2\"/>\x01"), answer(nested),
+          answer("<item id=\"2\"/>\x01"), answer(repeated("<a>", 300) + repeated("</a>", 300)),
           answer("<item id=\"2\"/><?xml version=\"1.0\"?>"), std::string("<!DOCTYPE a>")}) {
         EXPECT_EQ(parser.parse(bad), -1) << bad.substr(0, 500);
     }
@@ -163,32 +179,23 @@ TEST(Parser, KnowsNodesOfAnyTypeByTheirName) {
 }
 
 TEST(Parser, TakesNoMoreThroughEntitiesThanWasSent) {
-    std::string bomb = "<!DOCTYPE a [<!ENTITY e0 \"<item id='e'/>\">";
-    for (int i = 1; i < 20; ++i) {
-        bomb += "<!ENTITY e" + std::to_string(i) + " \"";
-        for (int k = 0; k < 10; ++k) {
-            bomb += "&e" + std::to_string(i - 1) + ";";
-        }
-        bomb += "\">";
-    }
+    const std::string declared = "<!DOCTYPE a [" + bomb("", "<item id='e'/>", 20);
     testing::internal::CaptureStderr();
     Parser few;
-    ASSERT_EQ(few.parse(bomb + "]><a>&e1;<item id=\"1\"/></a>"), 0);
-    EXPECT_LE(few.items->size(), bomb.size() / 7);
+    ASSERT_EQ(few.parse(declared + "]><a>&e1;<item id=\"1\"/></a>"), 0);
+    EXPECT_LE(few.items->size(), declared.size() / 7);
     EXPECT_EQ(few.items->front()->getValueByKey("id"), "e");
     EXPECT_EQ(few.items->back()->getValueByKey("id"), "1");
-    few.parse(bomb + "]><a>&e19;<item id=\"&e19;\"/></a>");
+    few.parse(declared + "]><a>&e19;<item id=\"&e19;\"/></a>");
     few.parse("<!DOCTYPE a [<!ENTITY a \"&b;\"><!ENTITY b \"&a;\">]><a>&a;<item>&b;</item></a>");
     // Each declaration leads on to the next, and that one back to the first.
     few.parse("<!DOCTYPE a [<!ENTITY a \"<x/>\"><!ENTITY b \"&a;\">]><a>&b;&a;</a>");
 
     const std::string text(10000, 'x');
-    std::string longOnes = "<!DOCTYPE a [<!ENTITY e \"" + text + "\">]><a>";
-    for (int i = 0; i < 1000; ++i) {
-        longOnes += "<item id=\"&e;\"/>";
-    }
     Parser parser;
-    ASSERT_EQ(parser.parse(longOnes + "</a>"), 0);
+    ASSERT_EQ(parser.parse("<!DOCTYPE a [<!ENTITY e \"" + text + "\">]><a>" +
+                           repeated("<item id=\"&e;\"/>", 1000) + "</a>"),
+              0);
     testing::internal::GetCapturedStderr();
     EXPECT_EQ(parser.items->size(), 1000U);
     EXPECT_EQ(parser.items->front()->getValueByKey("id"), text);
@@ -232,32 +239,19 @@ TEST(Parser, GrowsNoFurtherThanATextWithoutADocumentType) {
     for (int i = 0; i < 500; ++i) {
         many += " xmlns:p" + std::to_string(i) + " CDATA \"\"";
     }
-    std::string items;
-    std::string references;
-    for (int i = 0; i < 5000; ++i) {
-        items += "<item/>";
-        references += "%p;";
-    }
+    const std::string items = repeated("<item/>", 5000);
     const std::size_t usual = 20 * bytesFor("<a t=\"" + large + "\">" + items + "</a>");
     for (const std::string &declared :
          {"<!ATTLIST item xmlns:q CDATA \"" + large + "\">",
           "<!ATTLIST item xmlns:q CDATA \"" + large + "\" xmlns CDATA \"\">",
           "<!ATTLIST item xmlns:" + large.substr(0, 40000) + " CDATA \"x\">",
           "<!ATTLIST item" + many + ">",
-          "<!ENTITY % p \"" + large.substr(0, 7000) + "\">" + references}) {
+          "<!ENTITY % p \"" + large.substr(0, 7000) + "\">" + repeated("%p;", 5000)}) {
         EXPECT_LT(bytesFor("<!DOCTYPE a [" + declared + "]><a>" + items + "</a>"), usual)
             << declared.substr(0, 60);
     }
     // Ends, and tells no endless story of it.
-    std::string loop = "<!DOCTYPE a [<!ENTITY % p0 \"<?x?>\">";
-    for (int i = 1; i < 5; ++i) {
-        loop += "<!ENTITY % p" + std::to_string(i) + " \"";
-        for (int k = 0; k < 10; ++k) {
-            loop += "&#37;p" + std::to_string(i - 1) + ";";
-        }
-        loop += "\">";
-    }
-    EXPECT_LT(bytesFor(loop + "%p4;]><a/>"), usual);
+    EXPECT_LT(bytesFor("<!DOCTYPE a [" + bomb("%", "<?x?>", 5) + "%e4;]><a/>"), usual);
     Parser parser;
     ASSERT_EQ(parser.parse("<!DOCTYPE a [<!ENTITY % p \"<!ENTITY e 'x'>\">%p;]><item id=\"&e;\"/>"),
               0);
@@ -293,20 +287,12 @@ TEST(Parser, FetchesNothingAndOpensNoFile) {
 }
 
 TEST(Parser, TakesDeepAndLargeAnswers) {
-    std::string nested = "<item id=\"deep\"><res>1";
-    std::string open;
-    std::string close;
-    for (int i = 0; i < 100; ++i) {
-        nested += "<res>2";
-        open += "<a>";
-        close += "</a>";
-    }
-    for (int i = 0; i < 100; ++i) {
-        nested += "</res>";
-    }
-    EXPECT_EQ(dumpOf(open + "<item id=\"deep\"/>" + close), "--\n[0]:\n0: id=deep  \n\n");
+    EXPECT_EQ(dumpOf(repeated("<a>", 100) + "<item id=\"deep\"/>" + repeated("</a>", 100)),
+              "--\n[0]:\n0: id=deep  \n\n");
     Parser parser;
-    ASSERT_EQ(parser.parse(nested + "</res></item>"), 0);
+    ASSERT_EQ(parser.parse("<item id=\"deep\">" + repeated("<res>1", 101) +
+                           repeated("</res>", 101) + "</item>"),
+              0);
     int depth = 0;
     for (const ItemNode *node = parser.items->front(); node->children != nullptr; ++depth) {
         node = node->children->front();
