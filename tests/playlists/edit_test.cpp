@@ -4,6 +4,7 @@
 #include <functional>
 #include <sstream>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "families.h"
@@ -103,35 +104,25 @@ class Edit : public stand_in::Test,
     }
 };
 
-INSTANTIATE_TEST_SUITE_P(, Edit, testing::ValuesIn(kFamilies),
-                         [](const auto &family) -> std::string {
-                             return family.param.isShared ? "Shared" : "Personal";
-                         });
+INSTANTIATE_TEST_SUITE_P(, Edit, testing::ValuesIn(kFamilies));
 
 const std::string kSorted = "sort(0 items, 1)\n";
 const char *const kRemovalFields = "id, path, title, album";
 
 TEST_P(Edit, RemovesPositionsOfTheFileAsItWas) {
-    const struct {
-        const char *entries;
-        const char *selection;
-        const char *left;
-    } cases[] = {
+    const std::tuple<const char *, const char *, const char *> cases[] = {
         {"a b c", "1", "a c"},
         {"a b c", "0,0,9", "b c"},
         {"a b c", "2,1,0", ""},
         {"a b c", " 1,01,+1,1x,,-1,4294967297", "a b c"},
         {"a b c d e f g h i j k", "10,2,0", "b d e f g h i j"},
     };
-    for (const auto &each : cases) {
-        given(each.entries);
-        EXPECT_EQ(outcome(remove(each.selection)),
-                  "0 " + looked() + kSorted + parsed(kRemovalFields));
-        EXPECT_EQ(contents(), each.left) << each.selection;
+    for (const auto &[entries, selection, left] : cases) {
+        given(entries);
+        EXPECT_EQ(outcome(remove(selection)), "0 " + looked() + kSorted + parsed(kRemovalFields));
+        EXPECT_EQ(contents(), left) << selection;
     }
-}
-
-TEST_P(Edit, AnEmptySelectionIsASuccess) {
+    // An empty selection is a success.
     given("a b");
     const std::string expected =
         "0 " + looked() + kSorted + line(" (999)", " (1518)", "There is no selected item.");
@@ -143,13 +134,7 @@ TEST_P(Edit, AnEmptySelectionIsASuccess) {
 }
 
 TEST_P(Edit, ReplacesARun) {
-    const struct {
-        const char *entries;
-        const char *records;
-        int start;
-        int count;
-        const char *expected;
-    } cases[] = {
+    const std::tuple<const char *, const char *, int, int, const char *> cases[] = {
         {"a b c", "x", 1, 0, "a x b c"},
         {"a b c", "x", 1, 1, "a x c"},
         {"a b c", "x y", 1, 1, "a x y c"},
@@ -168,46 +153,32 @@ TEST_P(Edit, ReplacesARun) {
         {"a b c", "x", INT_MIN, -1, "x a b c"},
         {"a b c", "x", 2, -2, "a b x a b c"},
     };
-    for (const auto &each : cases) {
-        given(each.entries);
-        EXPECT_EQ(outcome(update(each.records, each.start, each.count)),
-                  "0 " + looked() + parsed("*"));
-        EXPECT_EQ(contents(), each.expected)
-            << each.entries << " | " << each.records << " " << each.start << " " << each.count;
+    for (const auto &[entries, records, start, count, expected] : cases) {
+        given(entries);
+        EXPECT_EQ(outcome(update(records, start, count)), "0 " + looked() + parsed("*"));
+        EXPECT_EQ(contents(), expected)
+            << entries << " | " << records << " " << start << " " << count;
     }
-}
-
-TEST_P(Edit, StartsBehindTheEnd) {
-    const struct {
-        int start;
-        int count;
-        const char *line;
-    } cases[] = {
-        {3, 1, "Bad parameters. Start[3] > TotalRow[3]"},
-        {4, 0, "Bad parameters. Start[4] > TotalRow[4]"},
-        {INT_MAX, 0, "Bad parameters. Start[2147483647] > TotalRow[4]"},
-    };
     given("a b c");
-    for (const auto &each : cases) {
-        EXPECT_EQ(outcome(update("x", each.start, each.count)),
-                  "-1 " + looked() + parsed("*") + line(":1096", ":1687", each.line));
-        EXPECT_EQ(contents(), "before") << each.line;
+    for (const auto &[start, count, total] : {std::tuple{3, 1, 3}, {4, 0, 4}, {INT_MAX, 0, 4}}) {
+        EXPECT_EQ(outcome(update("x", start, count)),
+                  "-1 " + looked() + parsed("*") +
+                      line(":1096", ":1687",
+                           "Bad parameters. Start[" + std::to_string(start) + "] > TotalRow[" +
+                               std::to_string(total) + "]"));
+        EXPECT_EQ(contents(), "before") << start;
     }
 }
 
 TEST_P(Edit, AppendsAsManyAsCounted) {
-    const struct {
-        const char *entries;
-        int count;
-        const char *expected;
-    } cases[] = {
+    const std::tuple<const char *, int, const char *> cases[] = {
         {"a b", 2, "a b x y"},   {"a b", 1, "a b x"},   {"a b", 0, "a b"}, {"a b", -7, "a b"},
         {"a b", INT_MIN, "a b"}, {"a b", 9, "a b x y"}, {"", 2, "x y"},
     };
-    for (const auto &each : cases) {
-        given(each.entries);
-        EXPECT_EQ(outcome(append("x y", each.count)), "0 " + looked() + parsed("*"));
-        EXPECT_EQ(contents(), each.expected) << each.entries << each.count;
+    for (const auto &[entries, count, expected] : cases) {
+        given(entries);
+        EXPECT_EQ(outcome(append("x y", count)), "0 " + looked() + parsed("*"));
+        EXPECT_EQ(contents(), expected) << entries << count;
     }
 }
 
@@ -282,19 +253,15 @@ TEST_P(Edit, OutOfMemory) {
     script().stringListFails = true;
     EXPECT_EQ(outcome(remove("0")), "-1 " + looked() + noList);
 
-    const struct {
-        std::function<int()> edit;
-        std::size_t pointers;
-        std::string line;
-    } cases[] = {
+    const std::tuple<std::function<int()>, std::size_t, std::string> cases[] = {
         {[&] { return update("x", 9, 0); }, 5, line(":1090", ":1681", "Failed to calloc()")},
         {[&] { return append("x", 4); }, 8, ""},
         {[&] { return removeMissing(); }, 4, ""},
     };
-    for (const auto &each : cases) {
-        failing_allocator::failOnSize(each.pointers * sizeof(void *));
-        EXPECT_EQ(outcome(each.edit()), "-1 " + looked() + parsed("*") + each.line);
-        EXPECT_TRUE(failing_allocator::hasFailed()) << each.pointers;
+    for (const auto &[edit, pointers, logged] : cases) {
+        failing_allocator::failOnSize(pointers * sizeof(void *));
+        EXPECT_EQ(outcome(edit()), "-1 " + looked() + parsed("*") + logged);
+        EXPECT_TRUE(failing_allocator::hasFailed()) << pointers;
     }
     EXPECT_EQ(contents(), "before");
 }

@@ -3,6 +3,8 @@
 
 #include <vorelix/playlists/playlist.h>
 
+#include <ostream>
+
 namespace playlists {
 
 /* The edits of shared playlists by id, and of personal ones by path. */
@@ -13,6 +15,9 @@ struct Family {
     int (*appendSongs)(const char *playlist, ZANO_PLAYLIST_REC *records, int recordCount);
     int (*removeMissing)(const char *playlist);
 };
+inline std::ostream &operator<<(std::ostream &out, const Family &family) {
+    return out << (family.isShared ? "Shared" : "Personal");
+}
 inline constexpr Family kFamilies[] = {
     {true, ZANOPlaylistRemoveSongs, ZANOPlaylistUpdateSongs, ZANOPlaylistAppendSongs,
      ZANOPlaylistRemoveMissing},

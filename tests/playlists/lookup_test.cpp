@@ -4,6 +4,7 @@
 #include <cstddef>
 #include <random>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "support/failing_allocator.h"
@@ -21,10 +22,7 @@ class Lookup : public stand_in::Test {};
 TEST_F(Lookup, SongsInTheOrderOfTheIds) {
     script().rows = {row(0, "zero"), row(3, "three"), row(7, "seven"), row(-1, "below zero"),
                      row(12, "twelve")};
-    const struct {
-        const char *ids;
-        const char *songs;
-    } cases[] = {
+    const std::pair<const char *, const char *> cases[] = {
         {"7,3,7", "7 seven, 3 three"},
         {"12,99,3", "12 twelve, 3 three"},
         {"99", ""},
@@ -36,12 +34,12 @@ TEST_F(Lookup, SongsInTheOrderOfTheIds) {
         {"4294967299,18446744073709551619,3", "-1 below zero, 3 three"},  // 2^32 + 3, 2^64 + 3
         {"4294967294,-4294967299,7", "-1 below zero, 7 seven"},
     };
-    for (const auto &each : cases) {
+    for (const auto &[ids, songs] : cases) {
         List list;
-        EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), each.ids)),
-                  "0 open(0, \"*\", \"id in (" + std::string(each.ids) +
-                      ")\", null, null, 0, 0, 0)\nclose\n");
-        EXPECT_EQ(list.text(), each.songs) << each.ids;
+        EXPECT_EQ(
+            outcome(ZANOMusicListGetByID(list.address(), ids)),
+            "0 open(0, \"*\", \"id in (" + std::string(ids) + ")\", null, null, 0, 0, 0)\nclose\n");
+        EXPECT_EQ(list.text(), songs) << ids;
     }
 }
 
@@ -81,17 +79,20 @@ TEST_F(Lookup, PlacesNodesAsAPlainWalkDoes) {
     }
 }
 
-TEST_F(Lookup, BadParameters) {
+TEST_F(Lookup, Failures) {
     List list;
     const std::string bad = "-1 3 playlist.cpp (97) Bad parameter.\n";
     EXPECT_EQ(outcome(ZANOMusicListGetByID(nullptr, "1")), bad);
     EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), nullptr)), bad);
     EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), "")), bad);
-}
 
-TEST_F(Lookup, FailedOpen) {
+    script().rows = {row(3, "three")};
+    script().stringListFails = true;
+    EXPECT_EQ(ZANOMusicListGetByID(list.address(), "3"), 0) << "without it nothing is placed";
+    EXPECT_EQ(list.head(), nullptr);
+    stand_in::takeTrace();
+
     script().openFails = true;
-    List list;
     ZANO_PLAYLIST_REC stale{};
     *list.address() = &stale;
     EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), "1,'x")),
@@ -100,32 +101,20 @@ TEST_F(Lookup, FailedOpen) {
     EXPECT_EQ(list.head(), nullptr);
 }
 
-TEST_F(Lookup, WithoutTheStringListNothingIsPlaced) {
-    script().rows = {row(3, "three")};
-    script().stringListFails = true;
-    List list;
-    EXPECT_EQ(ZANOMusicListGetByID(list.address(), "3"), 0);
-    EXPECT_EQ(list.head(), nullptr);
-}
-
 TEST_F(Lookup, OutOfMemory) {
     const std::string opened = "open(0, \"*\", \"id in (3,7)\", null, null, 0, 0, 0)\n";
-    const struct {
-        std::size_t size;
-        int after;
-        std::string trace;
-    } cases[] = {
+    const std::tuple<std::size_t, int, std::string> cases[] = {
         {35, 0, "3 playlist.cpp (104) Failed to alloc memory 35\n"},
         {7344, 0, opened + "3 playlist.cpp (121) Failed to alloc 7344\nclose\n"},
         {7344, 1, opened + "3 playlist.cpp (121) Failed to alloc 7344\nclose\n"},
     };
     script().rows = {row(3, "three"), row(7, "seven")};
-    for (const auto &each : cases) {
-        failing_allocator::failOnSize(each.size, each.after);
+    for (const auto &[size, after, trace] : cases) {
+        failing_allocator::failOnSize(size, after);
         List list;
-        EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), "3,7")), "-1 " + each.trace);
-        EXPECT_TRUE(failing_allocator::hasFailed()) << each.trace;
-        EXPECT_EQ(list.head(), nullptr) << each.trace;
+        EXPECT_EQ(outcome(ZANOMusicListGetByID(list.address(), "3,7")), "-1 " + trace);
+        EXPECT_TRUE(failing_allocator::hasFailed()) << trace;
+        EXPECT_EQ(list.head(), nullptr) << trace;
     }
 }
 

@@ -2,6 +2,7 @@
 
 #include <array>
 #include <string>
+#include <tuple>
 
 #include "support/platform_stand_in.h"
 
@@ -13,11 +14,7 @@ class PathSteps : public stand_in::Test {};
 
 TEST_F(PathSteps, OnlyTheFirstIsTakenOut) {
     const std::string longest(5000, 'a');
-    const struct {
-        std::string path;
-        int size;
-        std::string expected;
-    } cases[] = {
+    const std::tuple<std::string, int, std::string> cases[] = {
         {"/a/b/../c", 8192, "/a/c"},
         {"/a/b", 8192, "/a/b"},
         {"../x", 8192, "../x"},
@@ -31,16 +28,13 @@ TEST_F(PathSteps, OnlyTheFirstIsTakenOut) {
         {"/a/b/../cdef", 4, "/a/"},
         {"/a/cdef", 4, "/a/"},
     };
-    for (const auto &each : cases) {
+    for (const auto &[path, size, expected] : cases) {
         std::array<char, 8193> out;
         out.fill('#');
-        EXPECT_EQ(ZANOPathRelativeToABS(each.path.c_str(), out.data(), each.size), 0) << each.path;
-        EXPECT_EQ(out.data(), each.expected) << each.path;
-        EXPECT_EQ(out[static_cast<std::size_t>(each.size)], '#') << each.path;
+        EXPECT_EQ(ZANOPathRelativeToABS(path.c_str(), out.data(), size), 0) << path;
+        EXPECT_EQ(out.data(), expected) << path;
+        EXPECT_EQ(out[static_cast<std::size_t>(size)], '#') << path;
     }
-}
-
-TEST_F(PathSteps, BadParameters) {
     char out = '#';
     const std::string bad = "-1 3 playlist.cpp (1222) Bad parameters.\n";
     EXPECT_EQ(outcome(ZANOPathRelativeToABS(nullptr, &out, 1)), bad);

@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <tuple>
 #include <utility>
 #include <vector>
 
@@ -51,11 +52,7 @@ class Personal : public stand_in::Test {
 
 TEST_F(Personal, PagesOfMatchesByName) {
     make({"b.m3u", "a.m3u", "c.M3U", ".m3u", "d.pls", "e.wpl", "x.y.m3u"});
-    const struct {
-        int offset;
-        int limit;
-        std::string expected;
-    } cases[] = {
+    const std::tuple<int, int, std::string> cases[] = {
         {0, 0, line(1, "a") + line(2, "b") + line(3, "x.y")},
         {0, -1, line(1, "a") + line(2, "b") + line(3, "x.y")},
         {1, 1, line(1, "b")},
@@ -65,12 +62,12 @@ TEST_F(Personal, PagesOfMatchesByName) {
         {1, 2147483647, line(1, "b") + line(2, "x.y")},
         {-5, 2, line(1, "a") + line(2, "b")},
     };
-    for (const auto &each : cases) {
+    for (const auto &[offset, limit, expected] : cases) {
         Playlists list;
         const int count =
-            ZANOPersonalPlaylistListAll(folder.c_str(), list.address(), each.offset, each.limit);
+            ZANOPersonalPlaylistListAll(folder.c_str(), list.address(), offset, limit);
         EXPECT_EQ(count, static_cast<int>(ZANOPlaylistCount(list.head())));
-        EXPECT_EQ(list.text(), each.expected) << each.offset << " " << each.limit;
+        EXPECT_EQ(list.text(), expected) << offset << " " << limit;
     }
     EXPECT_EQ(ZANOPersonalPlaylistTotalGet(folder.c_str()), 3);
     EXPECT_EQ(theGlob.asked, folder + "/playlists/*.m3u 0");
@@ -98,23 +95,20 @@ TEST_F(Personal, WithoutMatchesTheListIsLeftAlone) {
 TEST_F(Personal, FailuresLeaveWhatWasTaken) {
     make({"a.m3u", "b.m3u", ".m3u"});
     const std::string taken = line(2, "b") + line(1, "a");
-    const struct {
-        std::string match;
-        std::string trace;
-    } cases[] = {
+    const std::pair<std::string, std::string> cases[] = {
         {path("gone.m3u"), ""},
         {".", "3 playlist.cpp:1349 . is not a valid path\n"},
         {folder, "3 playlist.cpp:1354 " + folder.substr(folder.rfind('/') + 1) +
                      " is not a valid filename\n"},
         {path("a.m3u"), "3 playlist.cpp:1360 failed to calloc memory\n"},
     };
-    for (const auto &each : cases) {
-        theGlob.matches = {path("a.m3u"), path("b.m3u"), each.match, path("a.m3u")};
+    for (const auto &[match, trace] : cases) {
+        theGlob.matches = {path("a.m3u"), path("b.m3u"), match, path("a.m3u")};
         failing_allocator::failOnSize(sizeof(ZANO_PLAYLIST), 2);
         Playlists list;
         EXPECT_EQ(ZANOPersonalPlaylistListAll(folder.c_str(), list.address(), 0, 0), -1);
-        EXPECT_EQ(list.text(), taken) << each.match;
-        EXPECT_EQ(takeTrace(), each.trace);
+        EXPECT_EQ(list.text(), taken) << match;
+        EXPECT_EQ(takeTrace(), trace);
     }
     failing_allocator::failOnSize(0);
     theGlob.matches = {path(".m3u")};

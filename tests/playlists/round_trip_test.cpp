@@ -6,6 +6,7 @@
 #include <array>
 #include <cmath>
 #include <cstring>
+#include <deque>
 
 #include "platform/playlists/music.h"
 
@@ -34,14 +35,17 @@ class RoundTripTest : public MusicTest {
     int below(int end) { return std::uniform_int_distribution(0, end - 1)(random_); }
     bool oneIn(int cases) { return below(cases) == 0; }
 
+    template <typename Value>
+    const Value &oneOf(const std::vector<Value> &values) {
+        return values[static_cast<std::size_t>(below(static_cast<int>(values.size())))];
+    }
+
     /* Every printable character of ASCII but /, and others of each length. */
     std::string text(int length, const std::vector<std::string> &others) {
         std::string made;
         while (static_cast<int>(made.size()) < length) {
             const char c = static_cast<char>(' ' + below('~' - ' ' + 1));
-            made += oneIn(8)
-                        ? others[static_cast<std::size_t>(below(static_cast<int>(others.size())))]
-                        : std::string(1, c == '/' ? 'x' : c);
+            made += oneIn(8) ? oneOf(others) : std::string(1, c == '/' ? 'x' : c);
         }
         return made;
     }
@@ -64,8 +68,8 @@ class RoundTripTest : public MusicTest {
 
     /* An entry, and what it is once it has been written and read. */
     struct Entry {
-        ZANO_PLAYLIST_REC given{};
-        ZANO_PLAYLIST_REC read{};
+        ZANO_MEDIA_INFO given{};
+        ZANO_MEDIA_INFO read{};
     };
 
     void tagged(ZANO_MEDIA_INFO &info) {
@@ -80,37 +84,24 @@ class RoundTripTest : public MusicTest {
     }
 
     Entry entry(bool withTags) {
-        Entry made;
-        ZANO_MEDIA_INFO &given = made.given.info;
-        ZANO_MEDIA_INFO &read = made.read.info;
         if (oneIn(4)) {
-            given = read = songs_[static_cast<std::size_t>(below(static_cast<int>(songs_.size())))];
-            return made;
+            const ZANO_MEDIA_INFO &song = oneOf(songs_);
+            return {song, song};
         }
-        tagged(given);
+        Entry made;
+        tagged(made.given);
         if (withTags) {
-            read = given;
-            read.duration = given.title[0] == '\0' ? 0 : std::trunc(given.duration);
+            made.read = made.given;
+            made.read.duration = made.given.title[0] == '\0' ? 0 : std::trunc(made.given.duration);
         }
-        const std::array<std::array<std::string, 2>, 4> kinds = {{
-            {(music() / "").string(), (music() / "").string()},
-            {music().parent_path().string() + "/", music().parent_path().string() + "/"},
-            {"http://radio/", "http://radio/"},
-            {"", (music() / "").string()},
-        }};
-        const auto &kind = kinds.at(static_cast<std::size_t>(below(4)));
-        const std::string rest = path().substr(0, 4095 - kind[1].size());
-
-        fill(given.path, kind[0] + rest);
-        fill(read.path, kind[1] + rest);
+        const std::string folder = (music() / "").string();
+        const auto place =
+            oneOf<std::string>({folder, music().parent_path().string() + "/", "http://radio/", ""});
+        const std::string &readAt = place.empty() ? folder : place;
+        const std::string rest = path().substr(0, 4095 - readAt.size());
+        fill(made.given.path, place + rest);
+        fill(made.read.path, readAt + rest);
         return made;
-    }
-
-    static void join(std::vector<Entry> &entries) {
-        for (std::size_t i = 1; i < entries.size(); ++i) {
-            entries[i - 1].given.next = &entries[i].given;
-            entries[i - 1].read.next = &entries[i].read;
-        }
     }
 
   private:
@@ -123,17 +114,18 @@ TEST_F(RoundTripTest, WhatIsWrittenIsReadBack) {
         const char *const form =
             std::array{"m3u", "pls", "wpl"}.at(static_cast<std::size_t>(round % 3));
         const std::string file = (music() / "list.").string() + form;
-        std::vector<Entry> entries;
+        std::deque<Entry> entries;
+        std::vector<ZANO_MEDIA_INFO *> given;
+        std::string expected;
         for (int left = below(12); left > 0; --left) {
             entries.push_back(entry(form == std::string("m3u")));
+            given.push_back(&entries.back().given);
+            const ZANO_PLAYLIST_REC read{entries.back().read, {nullptr}};
+            expected += dump(&read, 1);
         }
-        join(entries);
-        ASSERT_EQ(
-            ZANOWriteMusicPlaylist(entries.empty() ? nullptr : &entries[0].given, file.c_str()), 0);
-        const std::string read = dump(file);
-        ASSERT_EQ(read, dump(entries.empty() ? nullptr : &entries[0].read,
-                             static_cast<int>(entries.size())))
-            << file << " in round " << round;
+        given.push_back(nullptr);
+        ASSERT_EQ(ZANOWriteMusicPlaylistWithMediaList(given.data(), file.c_str()), 0);
+        ASSERT_EQ(dump(file), expected) << file << " in round " << round;
     }
 }
 

@@ -108,9 +108,7 @@ TEST_F(Writer, TagsOfEntriesThatAreNoTracks) {
     full.year = -1;
     full.disc = 2;
     full.track = 3;
-    for (char *tag : {full.title, full.artist, full.album, full.genre}) {
-        tag[0] = 'T';
-    }
+    full.title[0] = 'T';
     full.artist[0] = 'A';
     full.album[0] = 'L';
     full.genre[0] = 'G';
@@ -231,10 +229,7 @@ TEST_F(Writer, BadArgumentsCloseDescriptorZero) {
     ASSERT_EQ(bare.find('.'), std::string::npos);
     const std::string listLine = "3 playlist.cpp (721) Bad parameter.\n";
     const std::string arrayLine = "3 playlist.cpp (850) Bad parameter.\n";
-    const struct {
-        std::function<int()> call;
-        std::string trace;
-    } cases[] = {
+    const std::pair<std::function<int()>, std::string> cases[] = {
         {[] { return ZANOWriteMusicPlaylist(nullptr, nullptr); }, listLine},
         {[] { return writeList({}, ""); }, listLine},
         {[] { return writeArray({}, ""); }, arrayLine},
@@ -242,11 +237,11 @@ TEST_F(Writer, BadArgumentsCloseDescriptorZero) {
         {[&] { return writeList({}, bare); }, ""},
         {[&] { return writeArray({}, bare); }, ""},
     };
-    for (const auto &each : cases) {
+    for (const auto &[call, trace] : cases) {
         const int kept = dup(STDIN_FILENO);
         ASSERT_NE(kept, -1);
-        EXPECT_EQ(outcome(each.call()), "-1 " + each.trace);
-        EXPECT_EQ(fcntl(STDIN_FILENO, F_GETFD), -1) << each.trace;
+        EXPECT_EQ(outcome(call()), "-1 " + trace);
+        EXPECT_EQ(fcntl(STDIN_FILENO, F_GETFD), -1) << trace;
         EXPECT_EQ(dup2(kept, STDIN_FILENO), STDIN_FILENO);
         close(kept);
     }
