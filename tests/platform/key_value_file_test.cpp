@@ -32,10 +32,7 @@ class KeyValueFile : public testing::Test {
 };
 
 TEST_F(KeyValueFile, ChangesTheLinesOfTheKeyAndNoOther) {
-    const struct {
-        std::string before;
-        std::string after;
-    } cases[] = {
+    const std::pair<std::string, std::string> cases[] = {
         {"", "k=\"v\"\n"},
         {"a=\"1\"\nb=2", "a=\"1\"\nb=2\nk=\"v\"\n"},
         {"\r\n\n", "\r\n\nk=\"v\"\n"},
@@ -45,10 +42,10 @@ TEST_F(KeyValueFile, ChangesTheLinesOfTheKeyAndNoOther) {
         {std::string("a\0k=1\nk=\0\n", 11), std::string("a\0k=1\nk=\"v\"\n", 13)},
         {"k=\"v\"\nlast", "k=\"v\"\nlast"},
     };
-    for (const auto &each : cases) {
-        files::write(path(), each.before);
-        EXPECT_EQ(set("k", "v"), 0) << each.before;
-        EXPECT_EQ(files::read(path()), each.after) << each.before;
+    for (const auto &[before, after] : cases) {
+        files::write(path(), before);
+        EXPECT_EQ(set("k", "v"), 0) << before;
+        EXPECT_EQ(files::read(path()), after) << before;
         EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_NONE);
     }
     expectNothingBeside();

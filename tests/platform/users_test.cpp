@@ -9,6 +9,7 @@
 #include <filesystem>
 #include <fstream>
 #include <string>
+#include <tuple>
 
 #include "support/files.h"
 #include "system_paths_internal.h"
@@ -67,18 +68,13 @@ TEST_F(Users, HoldThePrivilegesWhoseGroupsListThem) {
     EXPECT_EQ(KLIBUserPrivilegeHas("ann", "Audio"), 0) << "no file";
     std::ofstream(ZANO_PATH_GROUP) << "Other:x:1:ann\nAudio:x:100:bob,ann,carl\nbroken\n"
                                    << "Audio:x:100:dora\nNobody:x:5:\n";
-    const struct {
-        const char *user;
-        const char *privilege;
-        int result;
-    } cases[] = {{"ann", "Audio", 1},  {"carl", "Audio", 1}, {"dora", "Audio", 1},
-                 {"an", "Audio", 0},   {"ann", "audio", 0},  {"bob", "Other", 0},
-                 {"", "Nobody", 0},    {"ann", "", 0},       {nullptr, "Audio", -1},
-                 {"ann", nullptr, -1}, {"ann", "broken", 0}};
-    for (const auto &each : cases) {
-        EXPECT_EQ(KLIBUserPrivilegeHas(each.user, each.privilege), each.result)
-            << (each.user != nullptr ? each.user : "null") << " "
-            << (each.privilege != nullptr ? each.privilege : "null");
+    const std::tuple<const char *, const char *, int> cases[] = {
+        {"ann", "Audio", 1},    {"carl", "Audio", 1}, {"dora", "Audio", 1}, {"an", "Audio", 0},
+        {"ann", "audio", 0},    {"bob", "Other", 0},  {"", "Nobody", 0},    {"ann", "", 0},
+        {nullptr, "Audio", -1}, {"ann", nullptr, -1}, {"ann", "broken", 0}};
+    for (const auto &[user, privilege, result] : cases) {
+        EXPECT_EQ(KLIBUserPrivilegeHas(user, privilege), result)
+            << testing::PrintToString(user) << " " << testing::PrintToString(privilege);
     }
     fs::remove(ZANO_PATH_GROUP);
     fs::create_directory(ZANO_PATH_GROUP);
@@ -87,11 +83,7 @@ TEST_F(Users, HoldThePrivilegesWhoseGroupsListThem) {
 }
 
 TEST(CaseCompare, IgnoresCaseAndNothingElse) {
-    const struct {
-        const char *one;
-        const char *other;
-        int result;
-    } cases[] = {
+    const std::tuple<const char *, const char *, int> cases[] = {
         {"admin", "ADmIN", 0},         {"", "", 0},
         {"STRASSE", "straße", 0},      {"ÉCOLE", "école", 0},
         {"ΣΊΣΥΦΟΣ", "σίσυφος", 0},     {"K", "\u212A", 0},
@@ -102,11 +94,9 @@ TEST(CaseCompare, IgnoresCaseAndNothingElse) {
         {"\xFF", "\xFF", 0},           {"\xE9", "\uFFFD", 1},
         {"caf\xC3", "caf\xC3\xA9", 1},
     };
-    for (const auto &each : cases) {
-        EXPECT_EQ(KLIBCUnicodeUTF8StrCaseCmp(each.one, each.other), each.result)
-            << each.one << " " << each.other;
-        EXPECT_EQ(KLIBCUnicodeUTF8StrCaseCmp(each.other, each.one), -each.result)
-            << each.other << " " << each.one;
+    for (const auto &[one, other, result] : cases) {
+        EXPECT_EQ(KLIBCUnicodeUTF8StrCaseCmp(one, other), result) << one << " " << other;
+        EXPECT_EQ(KLIBCUnicodeUTF8StrCaseCmp(other, one), -result) << other << " " << one;
     }
     EXPECT_EQ(KLIBCUnicodeUTF8StrCaseCmp(nullptr, nullptr), 0);
     EXPECT_LT(KLIBCUnicodeUTF8StrCaseCmp(nullptr, ""), 0);

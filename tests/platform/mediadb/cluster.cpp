@@ -70,32 +70,15 @@ int guardServer(const std::string &folder, const std::string &primary, int lifel
     const std::string programs = kPrograms;
     const std::string data = folder + "/data";
     bool isMade = user == nullptr || chown(folder.c_str(), user->pw_uid, user->pw_gid) == 0;
-    std::vector<std::string> words = {programs + "/initdb",
-                                      "-D",
-                                      data,
-                                      "-U",
-                                      kOwner,
-                                      "--no-sync",
-                                      "-A",
-                                      "trust",
-                                      "--encoding=UTF8",
-                                      "--locale=C.UTF-8"};
-    if (!primary.empty()) {
-        words = {programs + "/pg_basebackup",
-                 "-D",
-                 data,
-                 "-U",
-                 kOwner,
-                 "--no-sync",
-                 "-h",
-                 primary,
-                 "-R",
-                 "-X",
-                 "stream",
-                 "-c",
-                 "fast"};
-    }
-    isMade = isMade && succeeds(start(user, log, words));
+    isMade =
+        isMade &&
+        succeeds(primary.empty()
+                     ? start(user, log,
+                             {programs + "/initdb", "-D", data, "-U", kOwner, "--no-sync", "-A",
+                              "trust", "--encoding=UTF8", "--locale=C.UTF-8"})
+                     : start(user, log,
+                             {programs + "/pg_basebackup", "-D", data, "-U", kOwner, "--no-sync",
+                              "-h", primary, "-R", "-X", "stream", "-c", "fast"}));
     pid_t server = -1;
     if (isMade) {
         server = start(user, log,

@@ -8,6 +8,10 @@ namespace zano::mediadb {
 
 enum class EngineName { Sqlite, Postgresql };
 
+inline std::ostream &operator<<(std::ostream &out, EngineName engine) {
+    return out << (engine == EngineName::Sqlite ? "SQLite" : "PostgreSQL");
+}
+
 class EngineTest : public MediaDatabaseTest, public testing::WithParamInterface<EngineName> {
   protected:
     EngineTest() : MediaDatabaseTest(newLocation()) {}

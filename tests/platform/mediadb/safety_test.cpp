@@ -32,9 +32,7 @@ class SafetyTest : public EngineTest {
 };
 
 /* What is of a file only. */
-class FileTest : public MediaDatabaseTest {
-  protected:
-};
+class FileTest : public MediaDatabaseTest {};
 
 TEST_P(SafetyTest, TextsThatAreNoConditionsFailTheOpenAndNothingElse) {
     putThreeSongs();

@@ -91,10 +91,7 @@ TEST_F(ParserTest, PlaylistsAreFoundByTheirIds) {
     const std::string path = write("lists/sub.m3u", "../loose.mp3\n../../up.mp3\n");
     std::strncpy(row.path, path.c_str(), sizeof row.path - 1);
     ASSERT_EQ(MediaInfoDBSave(MEDIA_TABLE_PLAYLISTS, &row), 0);
-    const struct {
-        const char *id;
-        const char *expected;
-    } cases[] = {
+    const std::pair<const char *, const char *> cases[] = {
         {"1", "     ~/loose.mp3|||||0|0|0|0\n     ~/../up.mp3|||||0|0|0|0\n"},
         {"2", "error 1100 2: no playlist has this id\n"},
         {"", "error d00 : the id of a playlist is a number\n"},
@@ -102,10 +99,10 @@ TEST_F(ParserTest, PlaylistsAreFoundByTheirIds) {
         {"-1", "error d00 -1: the id of a playlist is a number\n"},
         {nullptr, "error d00 playlist: no playlist or no place for the total\n"},
     };
-    for (const auto &each : cases) {
+    for (const auto &[id, expected] : cases) {
         int total = -1;
-        const List list(ParsePlayListByField(each.id, &total, 0, 0, "*", 1));
-        EXPECT_EQ(dump(list.get(), total), each.expected);
+        const List list(ParsePlayListByField(id, &total, 0, 0, "*", 1));
+        EXPECT_EQ(dump(list.get(), total), expected);
     }
     EXPECT_EQ(ParsePlayListByField("1", nullptr, 0, 0, "*", 1), nullptr);
     EXPECT_EQ(KLIBCErrGet(), KLIB_ERR_BAD_PARAMETER);

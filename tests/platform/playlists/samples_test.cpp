@@ -1,4 +1,4 @@
-#include "samples.h"
+#include <regex>
 
 #include "format.h"
 #include "locations.h"
@@ -9,19 +9,23 @@
 namespace zano::playlists {
 namespace {
 
+/* Playlists as the library and other programs write them, in tests/data/playlists; beside each
+ * NAME stands NAME.dump, what is read from it. */
+std::vector<std::filesystem::path> samples() {
+    std::vector<std::filesystem::path> paths;
+    for (const auto &file : std::filesystem::directory_iterator(VORELIX_SAMPLES)) {
+        if (file.path().extension() != ".dump") {
+            paths.push_back(file.path());
+        }
+    }
+    return paths;
+}
+
 class SamplesTest : public MusicTest {};
 
 /* "/music/" in a sample that needs an absolute path stands for the music folder. */
-std::string placedAt(const std::string &folder, std::string text) {
-    const std::string mark = "///music/";
-    for (auto at = text.find(mark); at != std::string::npos; at = text.find(mark, at + 1)) {
-        text.replace(at, mark.size(), "//" + folder + "/");
-    }
-    const std::string host = "localhost/music/";
-    if (const auto at = text.find(host); at != std::string::npos) {
-        text.replace(at, host.size(), "localhost" + folder + "/");
-    }
-    return text;
+std::string placedAt(const std::string &folder, const std::string &text) {
+    return std::regex_replace(text, std::regex("(//|localhost)/music/"), "$1" + folder + "/");
 }
 
 TEST_F(SamplesTest, AreReadAsTheirDumpsSay) {
