@@ -3,6 +3,7 @@
 
 #include <map>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "config/line_internal.h"
@@ -13,15 +14,13 @@
 namespace {
 
 namespace fs = std::filesystem;
+using stand_in::outcome;
+using stand_in::takeTrace;
 
 constexpr const char *kPath = ZANO_PATH_AUDIO_CONF;
 constexpr const char *kDefaults =
     "AS_Player_Source=\"Music\"\nAS_Player_Repeat=\"All\"\nAS_Player_Shuffle=\"Off\"\n"
     "AS_Default_Music_PLS=\"\"\nAS_Default_IPod_PLS=\"\"\n";
-
-std::string readFile() {
-    return files::read(kPath);
-}
 
 template <typename Call>
 std::string printed(Call call) {
@@ -86,7 +85,7 @@ TEST_F(Configuration, IsReadToItsEndAndNothingStored) {
         EXPECT_EQ(printed([] { EXPECT_EQ(ZANOAudioConfPrintALL(), 1); }),
                   "CurentSource=0\nPlayMode=0\nszDefaultMusicPlaylist=\n");
     }
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Configuration, ThatCannotBeReadIsPrintedAndNotLogged) {
@@ -99,14 +98,14 @@ TEST_F(Configuration, ThatCannotBeReadIsPrintedAndNotLogged) {
     fs::create_directory(kPath);
     EXPECT_EQ(printed(read), failure + "21 (Is a directory)");
     EXPECT_EQ(printed([] { EXPECT_EQ(ZANOAudioConfGetALL(nullptr), 0); }), "");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 
     EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", "v", &conf), 1);
     EXPECT_EQ(ZANOAudioConfMatchKeyValue(nullptr, "v", &conf), 0);
     EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", nullptr, &conf), 0);
     EXPECT_EQ(ZANOAudioConfMatchKeyValue("k", "v", nullptr), 0);
     const std::string line = "3 config(168): Parameter error.\n";
-    EXPECT_EQ(stand_in::takeTrace(), line + line + line);
+    EXPECT_EQ(takeTrace(), line + line + line);
 }
 
 TEST_F(Configuration, KeysAreSetInPlace) {
@@ -115,19 +114,15 @@ TEST_F(Configuration, KeysAreSetInPlace) {
     EXPECT_EQ(ZANOAudioDefaultMusicPLSSet("/volume1/a \"b\".m3u"), 1);
     EXPECT_EQ(ZANOAudioDefaultIPodPLSSet("/i"), 1);
     EXPECT_EQ(ZANOAudioCurrentPlayModeSet(), 1);
-    EXPECT_EQ(readFile(),
+    EXPECT_EQ(files::read(kPath),
               "AS_Player_Source=\"Music\"\nAS_Player_Repeat=\"One\"\nAS_Player_Shuffle=\"Off\"\n"
               "AS_Default_Music_PLS=\"/volume1/a \"b\".m3u\"\nAS_Default_IPod_PLS=\"/i\"\n");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Configuration, FailedSetsSayTheValueIsEmpty) {
     const std::string path = kPath;
-    const struct {
-        int (*set)(const char *path);
-        const char *value;
-        std::string trace;
-    } cases[] = {
+    const std::tuple<int (*)(const char *), const char *, std::string> cases[] = {
         {[](const char *value) { return ZANOAudioConfSet(nullptr, value); }, "v",
          "3 config(17): Parameter error.\n"},
         {[](const char *value) { return ZANOAudioConfSet("k", value); }, nullptr,
@@ -145,9 +140,9 @@ TEST_F(Configuration, FailedSetsSayTheValueIsEmpty) {
          "value of key \"AS_Default_IPod_PLS\" to " +
              path + ".\n"},
     };
-    for (const auto &each : cases) {
-        EXPECT_EQ(each.set(each.value), 0) << each.trace;
-        EXPECT_EQ(stand_in::takeTrace(), each.trace);
+    for (const auto &[set, value, trace] : cases) {
+        EXPECT_EQ(set(value), 0) << trace;
+        EXPECT_EQ(takeTrace(), trace);
     }
     EXPECT_FALSE(fs::exists(kPath));
 }
@@ -157,33 +152,33 @@ TEST_F(Configuration, IsRestoredOnlyWhereThereIsNone) {
     fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
     umask(mask);
-    EXPECT_EQ(readFile(), kDefaults);
-    EXPECT_EQ(readFile().size(), 119U);
+    EXPECT_EQ(files::read(kPath), kDefaults);
+    EXPECT_EQ(files::read(kPath).size(), 119U);
     EXPECT_EQ(fs::status(ZANO_PATH_AUDIO_FOLDER).permissions(), fs::perms(0777));
     EXPECT_FALSE(fs::exists(ZANO_PATH_AUDIO_CONF_TEMPORARY));
     write("");
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
-    EXPECT_EQ(readFile(), "");
+    EXPECT_EQ(files::read(kPath), "");
     fs::remove(kPath);
     files::write(ZANO_PATH_AUDIO_CONF_TEMPORARY,
                  std::string("left over, and longer: ") + kDefaults);
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 1);
-    EXPECT_EQ(readFile(), kDefaults);
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(files::read(kPath), kDefaults);
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Configuration, ThatCannotBeRestoredIsLogged) {
     const fs::path folder = ZANO_PATH_AUDIO_FOLDER;
     fs::create_directory(ZANO_PATH_AUDIO_CONF_TEMPORARY);
-    EXPECT_EQ(ZANOSonmiraRestoreConf(), 0);
-    EXPECT_EQ(stand_in::takeTrace(), "3 config(339): Failed to open " +
-                                         std::string(ZANO_PATH_AUDIO_CONF_TEMPORARY) + ".\n");
+    EXPECT_EQ(
+        outcome(ZANOSonmiraRestoreConf()),
+        "0 3 config(339): Failed to open " + std::string(ZANO_PATH_AUDIO_CONF_TEMPORARY) + ".\n");
     const fs::path above = folder.parent_path();
     const fs::path aside = above.string() + ".aside";
     fs::rename(above, aside);
     EXPECT_EQ(ZANOSonmiraRestoreConf(), 0);
     fs::rename(aside, above);
-    EXPECT_EQ(stand_in::takeTrace(), "3 config(333): Failed to mkdir. [" + folder.string() + "]\n");
+    EXPECT_EQ(takeTrace(), "3 config(333): Failed to mkdir. [" + folder.string() + "]\n");
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 #include <array>
 #include <cstring>
 #include <string>
+#include <tuple>
 
 #include "support/platform_stand_in.h"
 
@@ -21,26 +22,22 @@ class PathById : public stand_in::Test {};
 
 TEST_F(PathById, GivesTheEscapedPath) {
     script().rows = {row(12, "it's"), row(13, "other")};
-    const struct {
-        const char *id;
-        int size;
-        const char *path;
-    } cases[] = {{"12", 64, "/volume1/music/it''s"}, {"1 or 'x'", 9, "/volume1"}, {"9", 1, ""}};
-    for (const auto &each : cases) {
+    const std::tuple<const char *, int, const char *> cases[] = {
+        {"12", 64, "/volume1/music/it''s"}, {"1 or 'x'", 9, "/volume1"}, {"9", 1, ""}};
+    for (const auto &[id, size, path] : cases) {
         std::string out(65, '#');
-        EXPECT_EQ(outcome(ZANOMusicGetPathById(out.data(), each.size, each.id)),
-                  "0 " + opened("4, \"*\", \" id=" + std::string(each.id) + " \"") + "close\n");
-        EXPECT_STREQ(out.c_str(), each.path);
-        EXPECT_EQ(out.find('#'), std::strlen(each.path) + 1);
+        EXPECT_EQ(outcome(ZANOMusicGetPathById(out.data(), size, id)),
+                  "0 " + opened("4, \"*\", \" id=" + std::string(id) + " \"") + "close\n");
+        EXPECT_STREQ(out.c_str(), path);
+        EXPECT_EQ(out.find('#'), std::strlen(path) + 1);
     }
     script().rows[0] = row(1, "");
     std::memset(script().rows[0].path, '\'', sizeof script().rows[0].path - 1);
     std::array<char, 8192> longest{};
     EXPECT_EQ(ZANOMusicGetPathById(longest.data(), longest.size(), "1"), 0);
     EXPECT_EQ(longest.data(), std::string(8190, '\''));
-}
 
-TEST_F(PathById, WithoutARowThePathIsEmpty) {
+    script().rows.clear();
     std::array<char, 8> out{"before"};
     for (const int size : {-5, 0, 1}) {
         EXPECT_EQ(ZANOMusicGetPathById(out.data(), size, "9"), 0);

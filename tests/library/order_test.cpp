@@ -7,10 +7,7 @@
 namespace {
 
 TEST(Order, TieBreaksFollowThePrimaryTerm) {
-    const struct {
-        const char *primary;
-        const char *order;
-    } cases[] = {
+    const std::pair<const char *, const char *> cases[] = {
         {nullptr, " album, disc, track, title, artist, genre, year, path, duration "},
         {"artist desc", " artist desc, album, disc, track, title, genre, year, path, duration "},
         {"lower(title) ",
@@ -19,11 +16,11 @@ TEST(Order, TieBreaksFollowThePrimaryTerm) {
         {"titles", " titles, album, disc, track, artist, genre, year, path, duration "},
         {"Tit", " Tit, album, disc, track, title, artist, genre, year, path, duration "},
     };
-    for (const auto &each : cases) {
+    for (const auto &[primary, order] : cases) {
         std::array<char, 1024> out{};
-        EXPECT_EQ(GenerateOrderString(each.primary, out.data(), out.size()),
-                  static_cast<int>(std::string(each.order).size()));
-        EXPECT_STREQ(out.data(), each.order);
+        EXPECT_EQ(GenerateOrderString(primary, out.data(), out.size()),
+                  static_cast<int>(std::string(order).size()));
+        EXPECT_STREQ(out.data(), order);
     }
 }
 

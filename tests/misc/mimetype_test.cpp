@@ -30,6 +30,7 @@ extern "C" __attribute__((visibility("default"))) ssize_t read(int file, void *o
 namespace {
 
 namespace fs = std::filesystem;
+using stand_in::takeTrace;
 
 class Mimetype : public stand_in::Test {
   protected:
@@ -55,10 +56,7 @@ class Mimetype : public stand_in::Test {
 
 TEST_F(Mimetype, IsTheSecondQuotedTextBehindTheFirstPlaceOfTheExtension) {
     const std::string unknown = "application/octet-stream";
-    const struct {
-        const char *mapping;
-        std::string type;
-    } cases[] = {
+    const std::pair<const char *, std::string> cases[] = {
         {"\"mp3\" \"audio/mpeg\"\n", "audio/mpeg"},
         {"\"ogg\" \"audio/ogg\"\n\"mp3\"=\"audio/mpeg\"", "audio/mpeg"},
         {"\"xmp3x\" \"wrong\"\n\"mp3\" \"right\"", "wrong"},
@@ -69,17 +67,16 @@ TEST_F(Mimetype, IsTheSecondQuotedTextBehindTheFirstPlaceOfTheExtension) {
         {"\"mp\" \"a\"", unknown},
         {"", unknown},
     };
-    for (const auto &each : cases) {
-        map(each.mapping);
-        EXPECT_EQ(typeOf("mp3"), each.type) << each.mapping;
+    for (const auto &[mapping, type] : cases) {
+        map(mapping);
+        EXPECT_EQ(typeOf("mp3"), type) << mapping;
     }
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Mimetype, IsCutToItsBuffer) {
     map("\"mp3\" \"audio/mpeg\"");
-    const std::pair<int, const char *> cases[] = {{6, "audio"}, {11, "audio/mpeg"}, {1, ""}};
-    for (const auto &[size, type] : cases) {
+    for (const auto &[size, type] : {std::pair{6, "audio"}, {11, "audio/mpeg"}, {1, ""}}) {
         std::vector<char> out(static_cast<std::size_t>(size), '?');
         EXPECT_EQ(ZANOAudioGetMimetype("mp3", out.data(), size), 0);
         EXPECT_STREQ(out.data(), type);
@@ -99,13 +96,13 @@ TEST_F(Mimetype, ComesFromAMappingThatIsMadeOnce) {
     EXPECT_EQ(typeOf("mp3"), "audio/made");
     fs::remove(ZANO_PATH_MIME_MAPPING);
     EXPECT_EQ(typeOf("mp3"), "audio/again");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Mimetype, FailsWhereTheMappingCannotBeMadeOrRead) {
     fs::create_directory(ZANO_PATH_MIME_MAPPING);
     EXPECT_EQ(typeOf("mp3"), "-1");
-    EXPECT_EQ(stand_in::takeTrace(), "3 misc:239 Could not generat the mimetype mapping file\n");
+    EXPECT_EQ(takeTrace(), "3 misc:239 Could not generat the mimetype mapping file\n");
     fs::remove(ZANO_PATH_MIME_MAPPING);
 
     map("\"mp3\" \"audio/mpeg\"");
@@ -116,17 +113,17 @@ TEST_F(Mimetype, FailsWhereTheMappingCannotBeMadeOrRead) {
     const std::string type = typeOf("mp3");
     ASSERT_EQ(setrlimit(RLIMIT_NOFILE, &limit), 0);
     EXPECT_EQ(type, "-1");
-    EXPECT_EQ(stand_in::takeTrace(), "3 misc:244 Could not open the mimetype mapping file\n");
+    EXPECT_EQ(takeTrace(), "3 misc:244 Could not open the mimetype mapping file\n");
 
     failing_allocator::failOnSize(fs::file_size(ZANO_PATH_MIME_MAPPING));
     EXPECT_EQ(typeOf("mp3"), "-1");
     EXPECT_TRUE(failing_allocator::hasFailed());
-    EXPECT_EQ(stand_in::takeTrace(), "3 misc:252 Malloc memory failed\n");
+    EXPECT_EQ(takeTrace(), "3 misc:252 Malloc memory failed\n");
 
     readsShort = true;
     EXPECT_EQ(typeOf("mp3"), "-1");
     readsShort = false;
-    EXPECT_EQ(stand_in::takeTrace(), "3 misc:258 Failed to read file\n");
+    EXPECT_EQ(takeTrace(), "3 misc:258 Failed to read file\n");
     EXPECT_EQ(typeOf("mp3"), "audio/mpeg");
 }
 

@@ -7,6 +7,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <string>
+#include <tuple>
 #include <vector>
 
 namespace {
@@ -34,11 +35,7 @@ std::string nextAndLast(const char *next, const char *last) {
 }
 
 TEST(PageBar, LeadsToThePagesThereAre) {
-    const struct {
-        int page;
-        int pages;
-        std::string bar;
-    } cases[] = {
+    const std::tuple<int, int, std::string> cases[] = {
         {1, 1, field("1", "disabled", "1")},
         {1, 0, field("1", "disabled", "0")},
         {2, 3, kFirst + previous("1") + field("2", "", "3") + nextAndLast("3", "3")},
@@ -71,11 +68,7 @@ TEST(PageFooter, NamesTheHostAndTheMaker) {
 }
 
 TEST(Html, IsEscapedWhereTheBufferHoldsTheWorstCase) {
-    const struct {
-        const char *source;
-        int size;
-        const char *out;  // "?" for nothing written
-    } cases[] = {
+    const std::tuple<const char *, int, const char *> cases[] = {
         {"a<b", 18, "a&lt;b"},
         {"a<b", 17, "?"},
         {"", 100, "?"},
@@ -88,14 +81,14 @@ TEST(Html, IsEscapedWhereTheBufferHoldsTheWorstCase) {
         {"\xC3\xA9\x01", 18, "\xC3\xA9\x01"},
         {nullptr, 100, "?"},
     };
-    for (const auto &each : cases) {
+    for (const auto &[source, size, expected] : cases) {
         // Of exactly that size, so that the sanitizer sees a step beyond.
-        std::vector<char> out(static_cast<std::size_t>(std::max(each.size, 2)), '?');
-        ZANOHtmlSpecialChar(each.source, out.data(), each.size);
-        if (*each.out == '?') {
+        std::vector<char> out(static_cast<std::size_t>(std::max(size, 2)), '?');
+        ZANOHtmlSpecialChar(source, out.data(), size);
+        if (*expected == '?') {  // nothing is written
             EXPECT_EQ(std::count(out.begin(), out.end(), '?'), static_cast<long>(out.size()));
         } else {
-            EXPECT_STREQ(out.data(), each.out) << each.source << " in " << each.size;
+            EXPECT_STREQ(out.data(), expected) << source << " in " << size;
         }
     }
     ZANOHtmlSpecialChar("x", nullptr, 6);

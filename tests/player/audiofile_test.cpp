@@ -6,6 +6,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "support/failing_allocator.h"
@@ -15,6 +16,8 @@
 namespace {
 
 namespace fs = std::filesystem;
+using stand_in::outcome;
+using stand_in::takeTrace;
 
 /* Its bytes, as they come on this machine. */
 std::string header(int first, int second, int third, int fourth) {
@@ -101,17 +104,12 @@ TEST_F(Queue, IsTheBytesOfItsRecords) {
     const std::unique_ptr<PlaylistInfo> again(AudioFile::PlaylistFileLoad(path_.c_str(), 1, 1));
     ASSERT_EQ(again->songs.size(), 1U);
     EXPECT_TRUE(stand_in::bytes(*again->songs[0]) == song(2));
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Queue, IsLoadedByTheSizeOfItsFile) {
     const std::string three = header(4, 5, 6, 1000) + songs(3);
-    const struct {
-        std::string file;
-        int start;
-        int count;
-        const char *list;
-    } cases[] = {
+    const std::tuple<std::string, int, int, const char *> cases[] = {
         {"", 0, 0, "0 1 0 0:"},
         {header(4, 5, 6, 7).substr(0, 15), 0, 0, "0 1 0 0:"},
         {header(4, 5, 6, 7), 0, 0, "4 5 6 0:"},
@@ -124,25 +122,23 @@ TEST_F(Queue, IsLoadedByTheSizeOfItsFile) {
         {three, 1, 1, "4 5 6 3: 2"},
         {three, 3, 0, "4 5 6 3:"},
         {three, 5, 0, "4 5 6 3:"},
-        {three, 0, -1, "4 5 6 3:"},
         {three, 0, INT32_MIN, "4 5 6 3:"},
         {three, -1, 0, "4 5 6 3:"},
         // 2^29 times 7336 is 0 in 32 bits.
         {three, 536870912 + 1, 0, "4 5 6 3: 2 3"},
     };
-    for (const auto &each : cases) {
-        files::write(path_, each.file);
-        EXPECT_EQ(loaded(path_, each.start, each.count), each.list)
-            << each.file.size() << " bytes from " << each.start;
-        EXPECT_TRUE(files::read(path_) == each.file);
+    for (const auto &[file, start, count, list] : cases) {
+        files::write(path_, file);
+        EXPECT_EQ(loaded(path_, start, count), list) << file.size() << " bytes from " << start;
+        EXPECT_TRUE(files::read(path_) == file);
     }
     EXPECT_EQ(loaded(folder_.path("missing")), "0 1 0 0:");
     EXPECT_FALSE(fs::exists(folder_.path("missing")));
     const std::unique_ptr<PlaylistInfo> none(AudioFile::PlaylistFileLoad(nullptr, 0, 0));
     EXPECT_EQ(text(none.get()), "0 1 0 0:");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
     EXPECT_EQ(loaded(folder_.path(".")), "0 1 0 0:");
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:51 Failed to open " + folder_.path(".") + ".\n");
+    EXPECT_EQ(takeTrace(), "3 audiofile:51 Failed to open " + folder_.path(".") + ".\n");
 }
 
 TEST_F(Queue, LockedByAnotherIsNotLoadedAndDeletedWhenSaved) {
@@ -150,14 +146,13 @@ TEST_F(Queue, LockedByAnotherIsNotLoadedAndDeletedWhenSaved) {
     {
         const Locker locker(path_);
         EXPECT_EQ(loaded(path_), "null");
-        EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:56 Failed to lock file.\n");
+        EXPECT_EQ(takeTrace(), "3 audiofile:56 Failed to lock file.\n");
         EXPECT_EQ(files::read(path_).size(), 16U + 7336U);
     }
     EXPECT_EQ(loaded(path_), "0 1 0 1: 1");
     const Locker locker(path_);
     PlaylistInfo list;
-    EXPECT_EQ(save(path_, list), -1);
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:129 Failed to lock file.\n");
+    EXPECT_EQ(outcome(save(path_, list)), "-1 3 audiofile:129 Failed to lock file.\n");
     EXPECT_FALSE(fs::exists(path_));
 }
 
@@ -165,47 +160,41 @@ TEST_F(Queue, ThatCannotBeUnlockedIsAFailure) {
     files::write(path_, header(0, 1, 0, 0) + songs(1));
     stand_in::script().unlockFails = true;
     EXPECT_EQ(loaded(path_, 1), "0 1 0 1:") << "nothing is unlocked at the end of the file";
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
     EXPECT_EQ(loaded(path_), "null");
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:101 Failed to unlock file.\n");
+    EXPECT_EQ(takeTrace(), "3 audiofile:101 Failed to unlock file.\n");
     PlaylistInfo list;
-    EXPECT_EQ(save(path_, list), -1);
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:146 Failed to unlock file.\n");
+    EXPECT_EQ(outcome(save(path_, list)), "-1 3 audiofile:146 Failed to unlock file.\n");
     EXPECT_FALSE(fs::exists(path_));
 }
 
 TEST_F(Queue, IsDeletedByAFailedSave) {
     PlaylistInfo list;
     fill(list, 3);
-    const struct {
-        rlim_t diskSize;
-        const char *failure;
-    } cases[] = {{15, "134 Failed to write the playlist to file.(File too large)\n"},
-                 {16 + 7336 + 100, "140 Failed to write the playlist to file.(File too large)\n"}};
-    for (const auto &each : cases) {
+    for (const auto &[size, line] : {std::pair{15, "134"}, {16 + 7336 + 100, "140"}}) {
         files::write(path_, "before");
         {
-            const files::FullDisk disk(each.diskSize);
+            const files::FullDisk disk(static_cast<rlim_t>(size));
             EXPECT_EQ(save(path_, list), -1);
         }
-        EXPECT_EQ(stand_in::takeTrace(), std::string("3 audiofile:") + each.failure);
+        EXPECT_EQ(takeTrace(), std::string("3 audiofile:") + line +
+                                   " Failed to write the playlist to file.(File too large)\n");
         EXPECT_FALSE(fs::exists(path_));
     }
     fs::create_symlink("/dev/full", path_);
-    EXPECT_EQ(save(path_, list), -1);
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 audiofile:134 Failed to write the playlist to file.(No space left on device)\n");
+    EXPECT_EQ(
+        outcome(save(path_, list)),
+        "-1 3 audiofile:134 Failed to write the playlist to file.(No space left on device)\n");
     EXPECT_FALSE(fs::exists(fs::symlink_status(path_)));
 
-    EXPECT_EQ(save(folder_.path("none/queue"), list), -1);
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 audiofile:124 Failed to open " + folder_.path("none/queue") + ".\n");
-    EXPECT_EQ(AudioFile::PlaylistFileSave(nullptr, &list), -1);
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:124 Failed to open (null).\n");
+    EXPECT_EQ(outcome(save(folder_.path("none/queue"), list)),
+              "-1 3 audiofile:124 Failed to open " + folder_.path("none/queue") + ".\n");
+    EXPECT_EQ(outcome(AudioFile::PlaylistFileSave(nullptr, &list)),
+              "-1 3 audiofile:124 Failed to open (null).\n");
     files::write(path_, "before");
     EXPECT_EQ(AudioFile::PlaylistFileSave(path_.c_str(), nullptr), -1);
     EXPECT_EQ(files::read(path_), "before");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(Queue, OfRandomSongsIsWhatTheDatabaseGives) {
@@ -214,8 +203,8 @@ TEST_F(Queue, OfRandomSongsIsWhatTheDatabaseGives) {
         fs::create_symlink("/dev/full", path_);
         stand_in::script().rows = {stand_in::row(2, "song 2"), stand_in::row(1, "song 1")};
         EXPECT_EQ(AudioFile::PlaylistRandomCreate(path_.c_str(), count), 1);
-        EXPECT_EQ(stand_in::takeTrace(), "open(0, \"*\", null, null, \"RANDOM()\", 0, " +
-                                             std::to_string(count) + ", 0)\nclose\n");
+        EXPECT_EQ(takeTrace(), "open(0, \"*\", null, null, \"RANDOM()\", 0, " +
+                                   std::to_string(count) + ", 0)\nclose\n");
         EXPECT_TRUE(files::read(path_) == header(0, 1, 0, 0) + song(2) + song(1));
     }
     for (const bool openFails : {false, true}) {
@@ -225,12 +214,12 @@ TEST_F(Queue, OfRandomSongsIsWhatTheDatabaseGives) {
         EXPECT_EQ(AudioFile::PlaylistRandomCreate(path_.c_str(), 5), 1);
         EXPECT_EQ(files::read(path_), header(0, 1, 0, 0));
     }
-    stand_in::takeTrace();
-    EXPECT_EQ(AudioFile::PlaylistRandomCreate(nullptr, 5), 0);
-    EXPECT_EQ(stand_in::takeTrace(), "3 audiofile:168 Bad parameters.\n");
+    takeTrace();
+    EXPECT_EQ(outcome(AudioFile::PlaylistRandomCreate(nullptr, 5)),
+              "0 3 audiofile:168 Bad parameters.\n");
     stand_in::script().unlockFails = true;
     EXPECT_EQ(AudioFile::PlaylistRandomCreate(path_.c_str(), 5), 0);
-    EXPECT_TRUE(stand_in::takeTrace().ends_with(
+    EXPECT_TRUE(takeTrace().ends_with(
         "3 audiofile:146 Failed to unlock file.\n3 audiofile:187 Failed to create playlist " +
         path_ + "\n"));
     EXPECT_FALSE(fs::exists(path_));
@@ -247,8 +236,7 @@ TEST_F(Queue, IsNotHalfMadeWhenMemoryRunsOut) {
     failing_allocator::failOnSize(sizeof(ZANO_MEDIA_INFO), 1);
     EXPECT_EQ(AudioFile::PlaylistRandomCreate(path_.c_str(), 5), 0);
     EXPECT_TRUE(failing_allocator::hasFailed());
-    EXPECT_TRUE(stand_in::takeTrace().ends_with("3 audiofile:187 Failed to create playlist " +
-                                                path_ + "\n"));
+    EXPECT_TRUE(takeTrace().ends_with("3 audiofile:187 Failed to create playlist " + path_ + "\n"));
     EXPECT_FALSE(fs::exists(path_));
 }
 

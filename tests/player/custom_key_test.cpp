@@ -12,6 +12,8 @@
 namespace {
 
 namespace fs = std::filesystem;
+using stand_in::outcome;
+using stand_in::takeTrace;
 
 const std::string kPath = ZANO_PATH_CUSTOM_KEYS;
 
@@ -65,17 +67,16 @@ TEST_F(CustomKeys, AreEmptyUntilTheFirstOneIsSet) {
                                       "\n   ]\n}\n");
     EXPECT_EQ(get(2), "t|v|\"Ø\"\n");
     EXPECT_EQ(get(4), "||");
-    EXPECT_EQ(stand_in::takeTrace(), "");
+    EXPECT_EQ(takeTrace(), "");
 }
 
 TEST_F(CustomKeys, AreFour) {
     for (const int key : {0, 5, -1, INT_MIN, INT_MAX}) {
         const std::string number = std::to_string(key);
         EXPECT_EQ(get(key), "-1");
-        EXPECT_EQ(ZANOAudioCustomSet(key, "t", "v", "x"), -1);
-        EXPECT_EQ(stand_in::takeTrace(), "3 custom_key:120 Index out of range [" + number +
-                                             "]\n3 custom_key:151 Index out of range [" + number +
-                                             "]\n");
+        EXPECT_EQ(takeTrace(), "3 custom_key:120 Index out of range [" + number + "]\n");
+        EXPECT_EQ(outcome(ZANOAudioCustomSet(key, "t", "v", "x")),
+                  "-1 3 custom_key:151 Index out of range [" + number + "]\n");
     }
     EXPECT_FALSE(fs::exists(kPath));
 }
@@ -123,9 +124,9 @@ TEST_F(CustomKeys, OfAFileOfAnyShapeAreReadAndSetOrRefused) {
         SCOPED_TRACE(each.before.substr(0, 50));
         files::write(kPath, each.before);
         EXPECT_EQ(get(2), each.got);
-        EXPECT_EQ(stand_in::takeTrace(), each.getTrace);
+        EXPECT_EQ(takeTrace(), each.getTrace);
         EXPECT_EQ(ZANOAudioCustomSet(2, "t", "v", "x"), each.after.empty() ? -1 : 0);
-        EXPECT_EQ(stand_in::takeTrace(), each.setTrace);
+        EXPECT_EQ(takeTrace(), each.setTrace);
         EXPECT_EQ(file(), each.after.empty() ? each.before : each.after);
     }
 }
@@ -133,8 +134,8 @@ TEST_F(CustomKeys, OfAFileOfAnyShapeAreReadAndSetOrRefused) {
 TEST_F(CustomKeys, ThatCannotBeReadAreNotSet) {
     fs::create_directory(kPath);
     EXPECT_EQ(get(1), "-1");
-    EXPECT_EQ(stand_in::takeTrace(), "3 custom_key:92 Failed to parse json file [" + kPath +
-                                         "]\n3 custom_key:125 Failed to get custom json.\n");
+    EXPECT_EQ(takeTrace(), "3 custom_key:92 Failed to parse json file [" + kPath +
+                               "]\n3 custom_key:125 Failed to get custom json.\n");
     fs::remove(kPath);
     files::write(kPath, "{}");
     Json::Value root;
@@ -146,14 +147,13 @@ TEST_F(CustomKeys, ThatCannotBeReadAreNotSet) {
         EXPECT_EQ(ZANOAudioCustomLoadJson(root), -1);
         setrlimit(RLIMIT_NOFILE, &usual);
     }
-    EXPECT_EQ(stand_in::takeTrace(),
+    EXPECT_EQ(takeTrace(),
               "3 custom_key:87 Failed to open json file [" + kPath + "] Too many open files\n");
     fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
     files::write(ZANO_PATH_AUDIO_FOLDER, "a file");
-    EXPECT_EQ(ZANOAudioCustomSet(1, "t", "v", "x"), -1);
-    EXPECT_EQ(stand_in::takeTrace(), "3 custom_key:79 Failed to access json file [" + kPath +
-                                         "] Not a directory\n3 custom_key:156 Failed to get "
-                                         "custom json.\n");
+    EXPECT_EQ(outcome(ZANOAudioCustomSet(1, "t", "v", "x")),
+              "-1 3 custom_key:79 Failed to access json file [" + kPath +
+                  "] Not a directory\n3 custom_key:156 Failed to get custom json.\n");
 }
 
 TEST_F(CustomKeys, ThatCannotBeWrittenAreAFailure) {
@@ -161,12 +161,11 @@ TEST_F(CustomKeys, ThatCannotBeWrittenAreAFailure) {
         const files::FullDisk disk(100);
         EXPECT_EQ(ZANOAudioCustomSet(1, "t", "v", "x"), -1);
     }
-    EXPECT_EQ(stand_in::takeTrace(), "3 custom_key:30 Failed to fwrite, [File too large]\n");
+    EXPECT_EQ(takeTrace(), "3 custom_key:30 Failed to fwrite, [File too large]\n");
     EXPECT_EQ(files::read(kPath).size(), 100U) << "written in place";
     fs::remove_all(ZANO_PATH_AUDIO_FOLDER);
-    EXPECT_EQ(ZANOAudioCustomSet(1, "t", "v", "x"), -1);
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 custom_key:24 Failed to fopen [" + kPath + "], [No such file or directory]\n");
+    EXPECT_EQ(outcome(ZANOAudioCustomSet(1, "t", "v", "x")),
+              "-1 3 custom_key:24 Failed to fopen [" + kPath + "], [No such file or directory]\n");
 }
 
 TEST_F(CustomKeys, AreLoadedInPlaceOfTheValueAtHand) {
@@ -182,11 +181,11 @@ TEST_F(CustomKeys, AreLoadedInPlaceOfTheValueAtHand) {
     files::write(kPath, "[7]");
     EXPECT_EQ(ZANOAudioCustomLoadJson(root), 0);
     EXPECT_EQ(root[0], 7);
-    stand_in::takeTrace();
-    EXPECT_EQ(vorelix::custom_key::ReadJsonFile(nullptr, root), -1);
-    EXPECT_EQ(vorelix::custom_key::WriteJsonFile(nullptr, root), -1);
-    EXPECT_EQ(stand_in::takeTrace(),
-              "3 custom_key:67 Bad parameter.\n3 custom_key:17 Bad parameter.\n");
+    takeTrace();
+    EXPECT_EQ(outcome(vorelix::custom_key::ReadJsonFile(nullptr, root)),
+              "-1 3 custom_key:67 Bad parameter.\n");
+    EXPECT_EQ(outcome(vorelix::custom_key::WriteJsonFile(nullptr, root)),
+              "-1 3 custom_key:17 Bad parameter.\n");
 }
 
 }  // namespace
