@@ -134,6 +134,8 @@ class Connection {
     void endCopy();
     /* So that a text that the server refuses fails before it is run. */
     void check(const Sql &sql) { prepare(sql.text()); }
+    /* PostgreSQL itself, and not an engine that only speaks its protocol. */
+    bool knowsPlans() const { return knowsPlans_; }
     /* Under which the server knows a statement from now until the next one is prepared. */
     const std::string &nameOf(const std::string &sql) { return prepare(sql).name; }
     /* The first column of the first row; `fallback` when there is none. */

@@ -51,6 +51,15 @@ void addComparison(Sql &sql, const std::vector<std::string_view> &columns, std::
     sql.add(")");
 }
 
+/* "songs.disc, songs.track" */
+std::string listOf(const std::vector<std::string_view> &columns, std::string_view qualifier) {
+    std::string text;
+    for (const std::string_view column : columns) {
+        text.append(text.empty() ? "" : ", ").append(qualifier).append(column);
+    }
+    return text;
+}
+
 /* How many songs have what is searched for; null: it is not known. */
 std::optional<Share> shareOf(Reader &reader, const SearchTerm &term) {
     const GramShares &grams = reader.gramsOf(term.column);
@@ -178,7 +187,8 @@ SongPlan::Way SongPlan::wayOfSearch(std::int64_t results, Column leading) const 
     if (anyOf([&](const auto &term) { return shareOf(reader_, term) == Share::Many; })) {
         return results <= kLongestWalk ? Way::Walk : Way::Planned;
     }
-    if (searches.empty() || !isIndexed(searches, leading) ||
+    const bool isIndexKnown = reader_.state().indexed != 0 && reader_.connection().knowsPlans();
+    if (searches.empty() || !isIndexKnown || !isIndexed(searches, leading) ||
         anyOf([&](const auto &term) { return mostOf(reader_, term) == Share::Many; })) {
         return Way::Planned;
     }
@@ -250,30 +260,25 @@ Statement SongPlan::page(const Query &query) {
 }
 
 /* Most songs along an order need not be looked at where its index knows the searched keys: what
- * the first results have in the index tells which rows to fetch. Rows that are equal by it come
- * with them and are cut off when all are in order. */
+ * the first results have in the index tells which rows to fetch, and how many are equal by it. They
+ * are looked up as so many rows from there on, for which no index but that of the order will do:
+ * the trigram index takes = too, and far longer. */
 Sql SongPlan::keyPage(const OrderTerm &leading, const Query &query, bool isWalk) const {
     const auto columns = indexedColumns(leading.column);
-    std::string keys;
-    for (const std::string_view column : columns) {
-        keys.append(keys.empty() ? "" : ", ").append(column);
-    }
-    Sql sql =
-        newSql("SELECT ").add(columnList(query.select, "songs.")).add(" FROM (SELECT DISTINCT ");
-    addSongs(sql.add(keys).add(" FROM (SELECT ").add(keys), isWalk);
-    sql.add(" ORDER BY ").add(columns[0]).add(leading.descending ? " DESC" : "");
-    for (auto column = columns.begin() + 1; column != columns.end(); ++column) {
-        sql.add(", ").add(*column);
-    }
+    const std::string keys = listOf(columns, "");
+    const std::string ofSongs = listOf(columns, "songs.");
     std::int64_t results = query.limit;
     while (results < query.offset + query.limit) {
         results *= 2;  // so that few statements are prepared
     }
-    addLimit(sql, results);
-    sql.add(") AS results) AS results JOIN songs USING(")
-        .add(keys)
-        .add(") ORDER BY ")
-        .add(orderText(leading, "songs."));
+    Sql sql = newSql("SELECT ").add(columnList(query.select, "songs.")).add(" FROM (SELECT ");
+    addSongs(sql.add(keys).add(", count(*) AS songs FROM (SELECT ").add(keys), isWalk);
+    sql.add(" ORDER BY ").add(columns[0]).add(leading.descending ? " DESC, " : ", ");
+    sql.add(listOf({columns.begin() + 1, columns.end()}, "")).add(" FETCH FIRST ");
+    sql.add(std::to_string(results)).add(" ROWS WITH TIES) AS results GROUP BY ").add(keys);
+    sql.add(") AS results CROSS JOIN LATERAL (SELECT * FROM songs WHERE (").add(ofSongs);
+    sql.add(")>=(").add(listOf(columns, "results.")).add(") ORDER BY ").add(ofSongs);
+    sql.add(" LIMIT results.songs) AS songs ORDER BY ").add(orderText(leading, "songs."));
     sql.addPage(query.offset, query.limit);
     return sql;
 }

@@ -36,8 +36,8 @@ Result withWordsForNoTable(const Work &work) {
 std::int64_t *State::find(std::string_view name) {
     const std::pair<std::string_view, std::int64_t *> rows[] = {
         {"schema", &schema},     {"songs", &songs},     {"generation", &generation},
-        {"anchored", &anchored}, {"artists", &artists}, {"albums", &albums},
-        {"genres", &genres}};
+        {"anchored", &anchored}, {"indexed", &indexed}, {"artists", &artists},
+        {"albums", &albums},     {"genres", &genres}};
     for (const auto &[known, value] : rows) {
         if (known == name) {
             return value;

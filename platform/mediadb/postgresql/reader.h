@@ -21,6 +21,7 @@ struct State {
     std::int64_t songs = 0;
     std::int64_t generation = 0;
     std::int64_t anchored = -1;
+    std::int64_t indexed = 0;
     std::int64_t artists = 0;
     std::int64_t albums = 0;
     std::int64_t genres = 0;

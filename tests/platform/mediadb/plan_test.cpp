@@ -174,9 +174,11 @@ TEST_F(PostgresqlPlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
             EXPECT_EQ(some.find("Kept"), 0U) << some;
             EXPECT_NE(some.find("Index Only Scan using songs_by_"), std::string::npos)
                 << order << some;
+            EXPECT_NE(some.find("Index Cond: (ROW("), std::string::npos) << order << some;
             const std::string unknown = planOf("title ilike '%\u0434\u043E\u043C%'", order, query);
             EXPECT_NE(unknown.find("Bitmap Index Scan on songs_grams"), std::string::npos)
                 << unknown;
+            EXPECT_NE(unknown.find("Index Cond: (ROW("), std::string::npos) << order << unknown;
         }
     }
 }
