@@ -183,6 +183,29 @@ TEST_F(PostgresqlPlanTest, ASearchLooksAtFewRowsOrFollowsTheOrder) {
     }
 }
 
+/* They are equal in all that the index of an order holds. */
+TEST_F(PostgresqlPlanTest, SongsThatAreFoundByTheirKeysKeepTheirOrder) {
+    std::vector<Song> songs;
+    for (int i = 0; i < 150; ++i) {
+        songs.push_back(song("/music/quiz/" + std::to_string(i * 7 % 150), "Quiz"));
+    }
+    put(*openCatalogue(location()), songs);
+    for (const std::string &order : orders()) {
+        const auto all = rows("title ilike '%qu%'", order.c_str());
+        ASSERT_EQ(all.size(), songs.size()) << order;
+        for (const Page page : {Page{0, 50}, Page{49, 3}, Page{50, 50}, Page{140, 60}}) {
+            const auto end = std::min<std::ptrdiff_t>(150, page.offset + page.limit);
+            EXPECT_EQ(rows("title ilike '%qu%'", order.c_str(), page),
+                      std::vector(all.begin() + page.offset, all.begin() + end))
+                << order << page.offset;
+        }
+    }
+    Query query;
+    query.limit = 50;
+    EXPECT_NE(planOf("title ilike '%qu%'", orders()[0], query).find("Index Cond: (ROW("),
+              std::string::npos);
+}
+
 }  // namespace
 }  // namespace postgresql
 }  // namespace zano::mediadb
