@@ -8,6 +8,8 @@
 #include <vorelix/users/audiousers.h>
 
 #include <csignal>
+#include <random>
+#include <thread>
 #include <utility>
 
 #include "support/failing_allocator.h"
@@ -177,6 +179,35 @@ TEST_F(UsersFile, OfAKilledWriterIsTheOneBefore) {
     }
     EXPECT_GT(writes, 1);
     EXPECT_TRUE(files::read(path_) == after) << "the last save goes over what was left";
+}
+
+TEST_F(UsersFile, OfAWriterKilledAtAnyMomentIsOneOfTheTwo) {
+    AudioUsers users[2];
+    std::string texts[2];
+    for (unsigned int at = 0; at < 2; ++at) {
+        for (unsigned int uid = 1; uid <= 3000; ++uid) {
+            users[at].SetUser(uid, at == 0 ? 31 : 0);
+        }
+        texts[at] = asText(users[at]);
+    }
+    ASSERT_TRUE(users[0].Save(path_));
+    const auto seed = std::random_device()();
+    std::mt19937 random(seed);
+    for (int kill = 0; kill < 50; ++kill) {
+        const pid_t child = process::start([&] {
+            for (unsigned int save = 1;; ++save) {
+                users[save % 2].Save(path_);
+            }
+            return 0;
+        });
+        /* The moment itself is what is random here. */
+        std::this_thread::sleep_for(std::chrono::microseconds(random() % 60000));
+        ASSERT_EQ(::kill(child, SIGKILL), 0);
+        process::statusOf(child);
+        const std::string text = files::read(path_);
+        ASSERT_TRUE(text == texts[0] || text == texts[1])
+            << "seed " << seed << ", kill " << kill << ": " << text.size() << " bytes";
+    }
 }
 
 }  // namespace

@@ -87,7 +87,7 @@ TEST_F(Changes, ThatAreKilledAreDoneOrNot) {
         const auto done = state();
         std::mt19937 random(4711);
         int killed = 0;
-        for (int round = 0; round < 30; ++round) {
+        for (int round = 0; round < 50; ++round) {
             files::write(each.file, before);
             const pid_t child = start({each.words});
             while (!fs::exists(each.draft) && waitpid(child, nullptr, WNOHANG | WNOWAIT) == 0) {
@@ -140,10 +140,13 @@ TEST_F(Changes, OnAFullDiskAreNone) {
 
 TEST_F(Changes, AtOnceAreAllMade) {
     constexpr int kCalls = 40;
+    constexpr int kSongs = 13;  // of a call that appends to the playlist
     const auto before = state();
     const std::string writer = "2 or 3";
     const std::string call = "another one in each call";
-    const Words commands[] = {{"playlist", "append", "p", writer},
+    Words append = {"playlist", "append", "p"};
+    append.insert(append.end(), kSongs, writer);
+    const Words commands[] = {append,
                               {"queue", "append", queue_, writer},
                               {"config", "set", call, "x"},
                               {"keys", "set", writer, "--value", call}};
@@ -158,12 +161,14 @@ TEST_F(Changes, AtOnceAreAllMade) {
         }
         return failures;
     });
-    for (const Words &shown : {Words{"playlist", "show", "p"}, Words{"queue", "show", queue_}}) {
+    const std::pair<Words, int> lists[] = {{{"playlist", "show", "p"}, kCalls * kSongs},
+                                           {{"queue", "show", queue_}, kCalls}};
+    for (const auto &[shown, songs] : lists) {
         Words all = shown;
-        all.insert(all.end(), {"--limit", "1000"});
+        all.insert(all.end(), {"--limit", "2000"});
         const std::string titles = json::titlesOf(answerOf(all)["entries"]);
-        EXPECT_EQ(std::count(titles.begin(), titles.end(), 'b'), kCalls) << shown[0];
-        EXPECT_EQ(std::count(titles.begin(), titles.end(), 'c'), kCalls) << shown[0];
+        EXPECT_EQ(std::count(titles.begin(), titles.end(), 'b'), songs) << shown[0];
+        EXPECT_EQ(std::count(titles.begin(), titles.end(), 'c'), songs) << shown[0];
     }
     EXPECT_EQ(answerOf({"config", "get"})["settings"].size(), 5U + 2 * kCalls);
     EXPECT_EQ(answerOf({"keys", "get", "2"})["keys"][0]["value"],
