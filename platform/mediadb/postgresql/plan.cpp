@@ -177,7 +177,7 @@ void SongPlan::addSongs(Sql &sql, bool isWalk) const {
 }
 
 SongPlan::Way SongPlan::wayOfSearch(std::int64_t results, Column leading) const {
-    if (conjuncts_.size() != 1 || rare_ != nullptr || results > kLongestAnchoredPage) {
+    if (conjuncts_.size() != 1 || results > kLongestAnchoredPage) {
         return Way::Planned;
     }
     const auto &searches = conjuncts_[0].searches;
@@ -223,12 +223,7 @@ Sql SongPlan::anchored(const StoredOrder &order, const Query &query) const {
     const OrderTerm &leading = order.leading;
     const std::int64_t skipped = query.offset % kAnchorDistance;
     const auto columns = placeColumns(leading.column);
-    Sql sql = newSql("WITH place AS MATERIALIZED (SELECT ");
-    std::string_view separator;
-    for (const std::string_view column : columns) {
-        sql.add(separator).add(column);
-        separator = ", ";
-    }
+    Sql sql = newSql("WITH place AS MATERIALIZED (SELECT ").add(listOf(columns, ""));
     sql.add(" FROM songs WHERE id=(SELECT song FROM anchors WHERE stored_order=");
     sql.bind(std::int64_t{order.number}).add(" AND place=");
     sql.bind(query.offset / kAnchorDistance).add(")) SELECT ");

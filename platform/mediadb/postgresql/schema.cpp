@@ -56,7 +56,11 @@ CREATE FUNCTION zano.zano_text(bytea) RETURNS text LANGUAGE plpgsql IMMUTABLE ST
 CREATE TABLE zano.grams(key text PRIMARY KEY, common bytea NOT NULL);
 UPDATE zano.state SET value=-1 WHERE name='anchored';
 )sql",
+                                                                  /* Of schema 2 there are two
+                                                                     kinds, one of which has
+                                                                     another column. */
                                                                   R"sql(
+ALTER TABLE zano.grams DROP COLUMN IF EXISTS frequent;
 ALTER TABLE zano.grams RENAME COLUMN common TO shares;
 DELETE FROM zano.grams;
 UPDATE zano.state SET value=-1 WHERE name='anchored';

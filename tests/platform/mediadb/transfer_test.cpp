@@ -318,6 +318,21 @@ TEST_P(TransferTest, AnOlderSchemaIsBroughtUpToDate) {
     }
 }
 
+TEST(PostgresqlTransferTest, BothKindsOfSchemaTwoAreBroughtUpToDate) {
+    for (const bool hasAnotherColumn : {false, true}) {
+        const std::string place = Cluster::get().newDatabase();
+        openCatalogue(place)->finish({});
+        Cluster::run(place, "ALTER TABLE zano.grams RENAME COLUMN shares TO common");
+        if (hasAnotherColumn) {
+            Cluster::run(place, "DELETE FROM zano.grams");
+            Cluster::run(place, "ALTER TABLE zano.grams ADD COLUMN frequent bytea NOT NULL");
+        }
+        Cluster::run(place, "UPDATE zano.state SET value=2 WHERE name='schema'");
+        openCatalogue(place)->finish({});
+        EXPECT_EQ(Cluster::run(place, "SELECT count(shares) FROM zano.grams"), "4");
+    }
+}
+
 TEST(PostgresqlTransferTest, WritersOfPlaylistsAndNoticesWaitForACopy) {
     const std::string place = Cluster::get().newDatabase();
     const auto target = openReplacement(place);
